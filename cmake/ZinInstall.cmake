@@ -1,0 +1,29 @@
+# Installation: libraries, the public include tree, a CMake package and a pkg-config file.
+include(CMakePackageConfigHelpers)
+
+set(ZIN_INSTALL_TARGETS ZinUtil ZinJtag ZinCore ZinMOX)
+if(TARGET ZinSim)
+  list(APPEND ZIN_INSTALL_TARGETS ZinSim)
+endif()
+install(TARGETS ${ZIN_INSTALL_TARGETS} EXPORT ZinMOXTargets
+  LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}
+  ARCHIVE DESTINATION ${CMAKE_INSTALL_LIBDIR}
+  RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR}
+  INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ZinRT ${PROJECT_SOURCE_DIR}/include/ZinMOX
+  DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
+if(TARGET ZinSim)
+  install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ZinSim DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
+endif()
+
+set(ZIN_CMAKE_DIR ${CMAKE_INSTALL_LIBDIR}/cmake/ZinMOX)
+install(EXPORT ZinMOXTargets NAMESPACE ZinMOX:: DESTINATION ${ZIN_CMAKE_DIR})
+configure_package_config_file(${PROJECT_SOURCE_DIR}/cmake/ZinMOXConfig.cmake.in
+  ${CMAKE_BINARY_DIR}/ZinMOXConfig.cmake INSTALL_DESTINATION ${ZIN_CMAKE_DIR})
+write_basic_package_version_file(${CMAKE_BINARY_DIR}/ZinMOXConfigVersion.cmake
+  COMPATIBILITY SameMajorVersion)
+install(FILES ${CMAKE_BINARY_DIR}/ZinMOXConfig.cmake ${CMAKE_BINARY_DIR}/ZinMOXConfigVersion.cmake
+  DESTINATION ${ZIN_CMAKE_DIR})
+
+configure_file(${PROJECT_SOURCE_DIR}/cmake/zinmox.pc.in ${CMAKE_BINARY_DIR}/zinmox.pc @ONLY)
+install(FILES ${CMAKE_BINARY_DIR}/zinmox.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
