@@ -21,9 +21,12 @@ typedef void (*ZinJtag_MessageHandler)(void* user, uint32_t handle, uint32_t cod
 /// transport until it is closed. Throws std::invalid_argument for a null transport.
 ZINJTAG_API uint32_t ZinJtag_openSession(std::shared_ptr<ZinRT::Zin_Transport> transport);
 
-/// Closes a session: the cores registered on it are destroyed, then the transport is released.
-/// Throws std::invalid_argument for an unknown handle. Must not be called while another thread
-/// is inside a call on the same session.
+/// Closes a session: the close hooks run (the cores registered on it are destroyed), the handle
+/// becomes unknown, then the transport is released (once no target lock holds the session any
+/// more). Throws std::invalid_argument for an unknown handle or a session that another thread is
+/// closing. A hook that throws does not keep the session open: the other hooks still run, the
+/// session is closed, then the first exception is passed on. Must not be called while another
+/// thread is inside a call on the same session.
 ZINJTAG_API void ZinJtag_closeSession(uint32_t handle);
 
 /// Registers the message handler of a session (null restores the default, which writes
@@ -32,7 +35,8 @@ ZINJTAG_API void ZinJtag_setMessageHandler(uint32_t handle, ZinJtag_MessageHandl
                                            void* user);
 
 /// Delivers one message to the session's host. Throws std::invalid_argument for an unknown
-/// handle.
+/// handle. The messages of one session reach its handler one at a time and in the order they
+/// were sent; a handler may itself send messages. A null text is delivered as the empty text.
 ZINJTAG_API void ZinJtag_session_sendMessage(uint32_t handle, uint32_t code, const char* text);
 
 /// Flushes the session's transport.
@@ -45,7 +49,8 @@ ZINJTAG_API void ZinJtag_session_withTransport(uint32_t handle,
                                                const std::function<void(ZinRT::Zin_Transport&)>& work);
 
 /// Registers a function that is called with the handle of every session being closed, before its
-/// transport is released. Used by the core list to drop the cores of a closed session.
+/// transport is released. Used by the core list to drop the cores of a closed session. A hook
+/// registered twice is called once; a null hook throws std::invalid_argument.
 ZINJTAG_API void ZinJtag_addSessionCloseHook(void (*hook)(uint32_t handle));
 
 /// For tests: whether any thread holds the session's target lock, and how many times the lock has

@@ -17,6 +17,10 @@ namespace ZinRT {
 ///
 /// Hexadecimal texts are most significant digit first with upper-case digits; lower-case digits
 /// are accepted on input. A text therefore means the number it reads as.
+///
+/// A zero byte is always kept right after the last byte (it is not counted by getSize), so a
+/// buffer whose bytes are characters can be used as a text through ptr(). A moved-from buffer is
+/// empty.
 class ZINUTIL_API Zin_ByteBuffer {
  public:
   /// An empty buffer (size 0).
@@ -52,20 +56,25 @@ class ZINUTIL_API Zin_ByteBuffer {
 
   /// The unsigned value of `length` (at most 32) consecutive bits starting at bit `bitOffset`;
   /// bit `bitOffset` becomes bit 0 of the result. Bits past the end of the buffer read as 0.
+  /// A length above 32 throws std::invalid_argument.
   uint32_t getBits(uint32_t bitOffset, uint32_t length) const;
 
   /// Writes into `out` the zero-terminated hexadecimal text of the bytes from byte `start` to the
   /// end, read as a little-endian number: two digits per byte, the last byte first. `out` is
-  /// replaced; `start` past the end gives the empty text.
+  /// replaced; `start` past the end gives the empty text. Afterwards `out.getSize()` is the number
+  /// of digits (the terminating zero follows them, outside the size).
   void bin2HexString(uint32_t start, Zin_ByteBuffer& out) const;
   /// A new buffer (owned by the caller) with the zero-terminated hexadecimal text of the
   /// `bitCount` bits that start at byte `start`: ceil(bitCount/4) digits, the most significant
-  /// first. Bits past the end of the buffer read as 0.
+  /// first. Bits past the end of the buffer read as 0; bits of the first digit beyond `bitCount`
+  /// are left out, so the text is exactly the value of those bits. The new buffer's size is the
+  /// number of digits.
   Zin_ByteBuffer* bin2HexString(uint32_t start, uint32_t bitCount) const;
   /// This buffer holds a hexadecimal text; converts its digits `first` to `last` (inclusive) to a
   /// new buffer (owned by the caller) of ceil(digits/2) bytes, the last two digits into byte 0
-  /// (the reverse of bin2HexString). Throws std::invalid_argument on a character that is not a
-  /// hexadecimal digit and std::out_of_range when the range is not inside the buffer.
+  /// (the reverse of bin2HexString). With an odd number of digits the first one fills the low half
+  /// of the last byte. Throws std::invalid_argument on a character that is not a hexadecimal digit
+  /// and std::out_of_range when the range is not inside the buffer (or `first` > `last`).
   Zin_ByteBuffer* hex2Bin(uint32_t first, uint32_t last) const;
 
  private:

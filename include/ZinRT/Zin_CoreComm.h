@@ -21,12 +21,16 @@ namespace ZinRT {
 class ZINCORE_API Zin_CoreComm {
  public:
   /// Reads the status of a core: `info` is zeroed and filled, `status` is zeroed and receives up
-  /// to `bitCount` status bits (at most its size). A reference without a core reads as zeros.
+  /// to `bitCount` status bits (at most its size); bits beyond them stay zero. A reference
+  /// without a core reads as zeros. Throws std::invalid_argument for a null `info` or an unknown
+  /// handle; exceptions of the transport pass through.
   static void getCoreStatus(uint32_t handle, ZIN_CORE_REF ref, ZIN_CORE_INFO* info,
                             Zin_ByteBuffer& status, uint32_t bitCount);
   /// Carries out a command sequence (see Zin_Transport::commandSequence). With `readBitCount`
   /// not 0, `readData` must hold ceil(readBitCount/8) bytes; they are zeroed first. The callback,
-  /// if given, is told when the sequence is done.
+  /// if given, is told once when the sequence is done: (lines, lines, readBitCount,
+  /// ZIN_PROGRESS_DONE); what it returns is ignored. A null `readData` with `readBitCount` not 0
+  /// throws std::invalid_argument.
   static void commandSequence(uint32_t handle, const std::string& text, unsigned char* readData,
                               uint32_t readBitCount, ZIN_PROGRESS_CALLBACK progress);
 };

@@ -19,14 +19,16 @@ namespace ZinRT {
 ///   number written in base 2;
 /// - a reverse bit text has character i equal to bit i of a packed vector;
 /// - a packed vector holds bit i in bit (i mod 8) of byte i/8.
-/// Malformed input (a character outside the digit set) throws std::invalid_argument.
+/// Malformed input (a character outside the digit set) throws std::invalid_argument, as does a
+/// null input pointer where input is expected. Each conversion works in one pass and may be
+/// given the same string as input and output.
 class ZINUTIL_API Zin_NumberUtil {
  public:
   /// Decimal text of `value`, no leading zeros.
   static std::string& uInt2DecStr(uint32_t value, std::string& out);
   /// Hexadecimal text of `value` with exactly widthBits/4 digits, zero padded. Throws
   /// std::out_of_range when the value needs more digits (widthBits 0 gives the empty text
-  /// for 0).
+  /// for 0). A width that is not a multiple of 4 is rounded down to one.
   static std::string& uInt2HexStr(uint32_t value, uint32_t widthBits, std::string& out);
   /// Hexadecimal text of the number that the bit text `bits` spells: ceil(n/4) digits for n
   /// bits, the bit text padded with zeros on the left to a multiple of four. The empty bit text
@@ -34,7 +36,8 @@ class ZINUTIL_API Zin_NumberUtil {
   static std::string& binStr2HexStr(const std::string& bits, std::string& out);
   /// The `bitCount` least significant bits of the number that the hexadecimal text `hex` spells,
   /// as a bit text of exactly `bitCount` characters (zeros on the left when the text has fewer
-  /// bits). The reverse of binStr2HexStr.
+  /// bits). The reverse of binStr2HexStr. Every digit of the text is checked, also those above
+  /// the bits kept.
   static std::string& hexStr2BinStr(const char* hex, uint32_t bitCount, std::string& out);
   /// Reverse bit text of the first `bitCount` bits of the packed vector `data`.
   static std::string& bin2ReverseBinStr(const unsigned char* data, uint32_t bitCount,

@@ -10,6 +10,10 @@
 
 namespace ZinRT {
 
+// Signals are always destroyed through their own class, so the destructor is deliberately not
+// virtual; the warning about it is silenced for this class only.
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wnon-virtual-dtor"
 /// A named signal of a core with a type and string properties.
 class ZINCORE_API Zin_SignalBase {
  public:
@@ -41,6 +45,7 @@ class ZINCORE_API Zin_SignalBase {
   std::string name_;
   std::map<std::string, std::string> properties_;
 };
+#pragma GCC diagnostic pop
 
 }  // namespace ZinRT
 

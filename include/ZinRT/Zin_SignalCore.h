@@ -20,10 +20,13 @@ class ZINCORE_API Zin_SignalCore : public Zin_Core {
                  const unsigned char* status, uint32_t statusBitCount);
   ~Zin_SignalCore() override;
 
-  /// Generic signal store: signals are kept (not owned) in adding order.
+  /// Generic signal store: signals are kept (not owned) in adding order. A null signal throws
+  /// std::invalid_argument.
   virtual void addSignal(Zin_SignalBase* signal);
-  /// The first stored signal with this name, type and position, or null.
+  /// The first stored signal with this name, type and position, or null. Only single signals
+  /// (Zin_Signal) have a position; other signals match on name and type alone.
   virtual Zin_SignalBase* getSignal(const std::string& name, uint32_t type, uint32_t position);
+  /// Drops every entry of `signal` from the store (the signal itself is not destroyed).
   virtual void removeSignal(Zin_SignalBase* signal);
 
   /// Number of port bits of a signal type, as last set (0 if never set).

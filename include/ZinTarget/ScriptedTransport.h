@@ -34,12 +34,14 @@ class ScriptedTransport : public ZinRT::Zin_Transport {
                     uint32_t manufacturerId = 0x1234, uint32_t revision = 1);
   void removeCore(const ZIN_CORE_REF& ref);
 
-  /// Bytes answered to the next read sequences, in order; with none queued a read returns zeros.
+  /// Bytes answered to the next read sequences (those with a read bit count), in order; with none
+  /// queued a read returns zeros.
   /// Bytes beyond the read buffer are dropped, missing ones read as zero.
   void queueReadData(std::vector<unsigned char> bytes);
 
   /// The next command sequence (or status read) throws: Runtime and LogicError with `text`,
-  /// BadAlloc with std::bad_alloc, NonStandard with an int.
+  /// BadAlloc with std::bad_alloc, NonStandard with an int. A failed command sequence is not
+  /// recorded among the transfers (the target never saw it); a failed status read is counted.
   void failNextCommand(Failure kind, std::string text = "scripted transfer failure");
   void failNextStatusRead(Failure kind, std::string text = "scripted status failure");
 
@@ -47,6 +49,8 @@ class ScriptedTransport : public ZinRT::Zin_Transport {
   void blockNextCommand();
   /// Waits until a command sequence is blocked inside the transport (false on timeout).
   bool waitUntilBlocked(uint32_t timeoutMs);
+  /// Lets the blocked command sequence go on; called before the sequence arrives, it lets the
+  /// next blocked sequence pass at once.
   void release();
 
   std::vector<Transfer> transfers() const;

@@ -28,8 +28,9 @@ struct MoxStatus {
 /// and sixteen-bit counts from bit 60. Bit i of the word is bit i mod 8 of byte i/8.
 uint32_t versionKey(const MoxStatus& status);
 
-/// The kStatusWordBytes status bytes of a MOX core. Throws std::invalid_argument when a count or
-/// a qx field does not fit its field in the layout of the core's version.
+/// The kStatusWordBytes status bytes of a MOX core; bits outside the fields are zero. Throws
+/// std::invalid_argument when a count or a qx field does not fit its field in the layout of the
+/// core's version (the two older layouts have no qx fields, so there only 0 fits).
 std::vector<unsigned char> buildMoxStatusWord(const MoxStatus& status);
 
 }  // namespace ZinTarget

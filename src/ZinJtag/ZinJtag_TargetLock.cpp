@@ -1,0 +1,48 @@
+// The re-entrant target lock of a session.
+#include <chrono>
+#include <stdexcept>
+#include <string>
+
+#include "ZinJtag_Session.h"
+
+ZinJtagTargetLock::ZinJtagTargetLock(uint32_t handle, uint32_t timeoutMs)
+    : session_(ZinJtagDetail::findSession(handle, "ZinJtagTargetLock")) {
+  ZinJtagSessionState& s = *session_;
+  const std::thread::id self = std::this_thread::get_id();
+  std::unique_lock<std::mutex> guard(s.lockMutex);
+  if (s.depth != 0 && s.owner == self) {
+    ++s.depth;
+    ++s.lockCount;
+    return;
+  }
+  const bool free = s.lockReleased.wait_for(guard, std::chrono::milliseconds(timeoutMs),
+                                            [&s] { return s.depth == 0; });
+  if (!free) {
+    throw std::runtime_error("ZinJtag: target lock of session " + std::to_string(handle) +
+                             " not obtained within " + std::to_string(timeoutMs) + " ms");
+  }
+  s.owner = self;
+  s.depth = 1;
+  ++s.lockCount;
+}
+
+ZinJtagTargetLock::~ZinJtagTargetLock() {
+  ZinJtagSessionState& s = *session_;
+  std::lock_guard<std::mutex> guard(s.lockMutex);
+  if (--s.depth == 0) {
+    s.owner = std::thread::id();
+    s.lockReleased.notify_one();
+  }
+}
+
+bool ZinJtag_session_isLocked(uint32_t handle) {
+  const auto session = ZinJtagDetail::findSession(handle, "ZinJtag_session_isLocked");
+  std::lock_guard<std::mutex> guard(session->lockMutex);
+  return session->depth != 0;
+}
+
+uint64_t ZinJtag_session_lockCount(uint32_t handle) {
+  const auto session = ZinJtagDetail::findSession(handle, "ZinJtag_session_lockCount");
+  std::lock_guard<std::mutex> guard(session->lockMutex);
+  return session->lockCount;
+}

@@ -1,0 +1,87 @@
+// Bit fields and hexadecimal texts of a byte buffer.
+#include <cstring>
+#include <memory>
+#include <stdexcept>
+#include <string>
+
+#include "ZinRT/Zin_ByteBuffer.h"
+#include "Zin_HexDigits.h"
+
+namespace ZinRT {
+
+uint32_t Zin_ByteBuffer::getBits(uint32_t bitOffset, uint32_t length) const {
+  if (length > 32) {
+    throw std::invalid_argument("Zin_ByteBuffer::getBits: length " + std::to_string(length) +
+                                " exceeds 32 bits");
+  }
+  if (length == 0) return 0;
+  // At most five bytes hold the field; bytes past the end read as zero.
+  const uint64_t firstByte = bitOffset / 8;
+  const unsigned char* bytes = uPtr();
+  uint64_t word = 0;
+  for (uint64_t i = 0; i < 5; ++i) {
+    const uint64_t index = firstByte + i;
+    if (index >= size_) break;
+    word |= static_cast<uint64_t>(bytes[index]) << (8 * i);
+  }
+  word >>= bitOffset % 8;
+  const uint64_t mask = (uint64_t{1} << length) - 1;
+  return static_cast<uint32_t>(word & mask);
+}
+
+void Zin_ByteBuffer::bin2HexString(uint32_t start, Zin_ByteBuffer& out) const {
+  const uint32_t count = start < size_ ? size_ - start : 0;
+  if (&out == this) {
+    Zin_ByteBuffer text;
+    bin2HexString(start, text);
+    out = std::move(text);
+    return;
+  }
+  out.resize(0);
+  out.resize(2 * count);  // also keeps the terminating zero after the digits
+  const unsigned char* bytes = uPtr() + start;
+  char* digits = out.ptr();
+  for (uint32_t i = 0; i < count; ++i) {
+    const unsigned char b = bytes[count - 1 - i];
+    digits[2 * i] = detail::kHexDigits[b >> 4];
+    digits[2 * i + 1] = detail::kHexDigits[b & 0x0F];
+  }
+}
+
+Zin_ByteBuffer* Zin_ByteBuffer::bin2HexString(uint32_t start, uint32_t bitCount) const {
+  const uint32_t digitCount = bitCount / 4 + (bitCount % 4 != 0 ? 1 : 0);
+  auto text = std::make_unique<Zin_ByteBuffer>(digitCount, 0, 0);
+  char* digits = text->ptr();
+  const unsigned char* bytes = uPtr();
+  // Digit k (counted from the least significant) is nibble k of the bits from byte `start`.
+  for (uint32_t k = 0; k < digitCount; ++k) {
+    const uint64_t index = static_cast<uint64_t>(start) + k / 2;
+    unsigned nibble = 0;
+    if (index < size_) nibble = (k % 2 == 0) ? (bytes[index] & 0x0F) : (bytes[index] >> 4);
+    // Bits beyond bitCount in the most significant digit are not part of the value.
+    if (k == digitCount - 1 && bitCount % 4 != 0) nibble &= (1u << (bitCount % 4)) - 1;
+    digits[digitCount - 1 - k] = detail::kHexDigits[nibble];
+  }
+  return text.release();
+}
+
+Zin_ByteBuffer* Zin_ByteBuffer::hex2Bin(uint32_t first, uint32_t last) const {
+  if (first > last || last >= size_) {
+    throw std::out_of_range("Zin_ByteBuffer::hex2Bin: digits " + std::to_string(first) + " to " +
+                            std::to_string(last) + " are not inside a text of " +
+                            std::to_string(size_) + " characters");
+  }
+  const uint32_t digitCount = last - first + 1;
+  const uint32_t byteCount = digitCount / 2 + digitCount % 2;
+  auto bin = std::make_unique<Zin_ByteBuffer>(byteCount, 0, 0);
+  const char* text = ptr();
+  unsigned char* bytes = bin->uPtr();
+  // The last digit is the least significant: digit pairs fill the bytes from byte 0 upwards.
+  for (uint32_t k = 0; k < digitCount; ++k) {
+    const int v = detail::hexValue(text[last - k], "Zin_ByteBuffer::hex2Bin");
+    bytes[k / 2] |= static_cast<unsigned char>(k % 2 == 0 ? v : v << 4);
+  }
+  return bin.release();
+}
+
+}  // namespace ZinRT
