@@ -1,7 +1,7 @@
 # Warnings that every target of this project is built with.
 add_library(zin_warnings INTERFACE)
 target_compile_options(zin_warnings INTERFACE
-  $<$<COMPILE_LANGUAGE:CXX>:-Wall -Wextra -Werror -Wpedantic -Wnon-virtual-dtor>
+  $<$<COMPILE_LANGUAGE:CXX>:-Wall -Wextra -Werror -Wpedantic>
   $<$<COMPILE_LANGUAGE:C>:-Wall -Wextra -Werror -Wpedantic>)
 
 # zin_add_shared_library(NAME SOURCES...): a shared library with a SOVERSION, a ZinMOX:: alias,

@@ -1,0 +1,84 @@
+// Whole-port writes and reads of a MOX core.
+#include <stdexcept>
+#include <string>
+
+#include "ZinMOX/ZinMOX_Core.h"
+#include "framework/ZinMOX_Framework.h"
+
+namespace ZinRT {
+
+namespace {
+
+// Packs a port string into a caller's vector, skipping null destinations.
+void packInto(uint8_t* destination, const std::string& bits) {
+  if (destination != nullptr) Zin_NumberUtil::reverseBinStr2Bin(bits, destination);
+}
+
+// A member caller (not only the exported functions) may pass a count; one that is neither 0 nor
+// the port's width would index past the port image.
+void checkPortCount(uint32_t count, uint32_t width, const char* function, const char* name) {
+  if (count != 0 && count != width) {
+    throw std::logic_error(std::string("ZinMOX_Core::") + function + "(): " + name + " " +
+                           std::to_string(count) + " is neither 0 nor the port width " +
+                           std::to_string(width));
+  }
+}
+
+}  // namespace
+
+void ZinMOX_Core::setPortBits(uint32_t handle, ZIN_CORE_REF coreRef, const uint8_t* asyncOutData,
+                              const uint8_t* asyncOutUpdateMask, uint32_t asyncOutDataBitCount,
+                              const uint8_t* syncOutData, const uint8_t* syncOutUpdateMask,
+                              uint32_t syncOutDataBitCount) {
+  checkPortCount(asyncOutDataBitCount, moxCoreInfo.async_output_count, "setPortBits",
+                 "asyncOutDataBitCount");
+  checkPortCount(syncOutDataBitCount, moxCoreInfo.sync_output_count, "setPortBits",
+                 "syncOutDataBitCount");
+  command.clearUpdateMasks();
+  std::string bits;
+  if (asyncOutDataBitCount != 0) {
+    command.setAsyncOutValueBits(
+        Zin_NumberUtil::bin2ReverseBinStr(asyncOutData, asyncOutDataBitCount, bits));
+    command.setAsyncOutUpdateBits(
+        Zin_NumberUtil::bin2ReverseBinStr(asyncOutUpdateMask, asyncOutDataBitCount, bits));
+  }
+  if (syncOutDataBitCount != 0) {
+    command.setSyncOutUpdateBits(
+        Zin_NumberUtil::bin2ReverseBinStr(syncOutUpdateMask, syncOutDataBitCount, bits));
+    const uint32_t stepBytes = mox::byteCount(syncOutDataBitCount);
+    for (uint32_t step = 0; step < ZinMOX_Command::STEP_COUNT; ++step) {
+      Zin_NumberUtil::bin2ReverseBinStr(syncOutData + step * stepBytes, syncOutDataBitCount, bits);
+      for (uint32_t bit = 0; bit < syncOutDataBitCount; ++bit) {
+        command.setPulseTrainStep(bit, step, bits[bit]);
+      }
+    }
+  }
+  command.writeOutputs(handle, coreRef);
+}
+
+void ZinMOX_Core::getPortBits(uint32_t handle, ZIN_CORE_REF coreRef, uint8_t* asyncInData,
+                              uint8_t* asyncInActivityUp, uint8_t* asyncInActivityDown,
+                              uint32_t asyncInDataBitCount, uint8_t* syncInData,
+                              uint8_t* syncInActivityUp, uint8_t* syncInActivityDown,
+                              uint8_t* syncInSyncActivityUp, uint8_t* syncInSyncActivityDown,
+                              uint32_t syncInDataBitCount) {
+  checkPortCount(asyncInDataBitCount, moxCoreInfo.async_input_count, "getPortBits",
+                 "asyncInDataBitCount");
+  checkPortCount(syncInDataBitCount, moxCoreInfo.sync_input_count, "getPortBits",
+                 "syncInDataBitCount");
+  command.readInputs(handle, coreRef);
+  if (asyncInDataBitCount != 0) {
+    packInto(asyncInData, command.getAsyncInValueBits());
+    packInto(asyncInActivityUp, command.getAsyncInActivityUpBits());
+    packInto(asyncInActivityDown, command.getAsyncInActivityDownBits());
+  }
+  if (syncInDataBitCount != 0) {
+    packInto(syncInData, command.getSyncInValueBits());
+    packInto(syncInActivityUp, command.getSyncInActivityUpBits());
+    packInto(syncInActivityDown, command.getSyncInActivityDownBits());
+    packInto(syncInSyncActivityUp, command.getSyncInSyncActivityUpBits());
+    packInto(syncInSyncActivityDown, command.getSyncInSyncActivityDownBits());
+  }
+}
+
+}  // namespace ZinRT

@@ -1,0 +1,121 @@
+// ZinMOX_SignalGroup: construction, copying, and the packing of its value bits onto port bits.
+#include "ZinMOX/ZinMOX_SignalGroup.h"
+
+#include <stdexcept>
+
+#include "ZinMOX/ZinMOX_Command.h"
+#include "framework/ZinMOX_Framework.h"
+
+namespace ZinRT {
+
+namespace {
+
+inline bool packedBit(const uint8_t* bytes, uint32_t bit) {
+  return ((bytes[bit / 8] >> (bit % 8)) & 1u) != 0;
+}
+
+inline void orPackedBit(uint8_t* bytes, uint32_t bit, char character) {
+  if (bytes != nullptr && character == '1') bytes[bit / 8] |= static_cast<uint8_t>(1u << (bit % 8));
+}
+
+bool isInputType(uint32_t type) {
+  return type == Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT ||
+         type == Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_INPUT;
+}
+
+// The group's positions index the port image of its own kind only: staging an input or
+// collecting an output would index another port's image.
+void checkDirection(uint32_t type, bool wantInput, const std::string& name) {
+  if (isInputType(type) != wantInput) {
+    throw std::logic_error(std::string(wantInput ? "Not an input signal: " : "Not an output signal: ") + name);
+  }
+}
+
+[[noreturn]] void failTooSmall(const std::string& name) {
+  throw std::logic_error("The size of the value is not large enough for the signal: " + name);
+}
+
+}  // namespace
+
+ZinMOX_SignalGroup::ZinMOX_SignalGroup(ZinMOX_Command* command, uint32_t type,
+                                       std::vector<uint32_t>& positions, const std::string& name,
+                                       const std::string& keyName)
+    : Zin_SignalGroup(type, 0, positions, name), keyName(keyName), command(command) {}
+
+ZinMOX_SignalGroup::ZinMOX_SignalGroup(const ZinMOX_SignalGroup& other) = default;
+
+ZinMOX_SignalGroup& ZinMOX_SignalGroup::operator=(const ZinMOX_SignalGroup& other) {
+  Zin_SignalGroup::operator=(other);
+  if (this != &other) keyName = other.keyName;
+  command = other.command;
+  return *this;
+}
+
+ZinMOX_SignalGroup::~ZinMOX_SignalGroup() = default;
+
+void ZinMOX_SignalGroup::setValues(const uint8_t* value, uint32_t byteSize, uint32_t stepCount) {
+  const uint32_t type = mox::plainSignalType(getType());
+  const std::vector<uint32_t>& positions = getPositionVector();
+  const uint32_t n = size();
+  const uint32_t bytes = mox::byteCount(n);
+  if (value == nullptr) throw std::logic_error("Null value for signal: " + getName());
+  checkDirection(type, false, getName());
+
+  if (type == Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_OUTPUT && stepCount <= 1) {
+    if (byteSize < bytes) failTooSmall(getName());
+    for (uint32_t i = 0; i < n; ++i) {
+      command->holdPulseTrain(positions[i], packedBit(value, i) ? '1' : '0');
+      command->setSyncOutUpdateChar(positions[i], '1');
+    }
+  } else if (type == Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_OUTPUT) {
+    if (static_cast<uint64_t>(byteSize) < static_cast<uint64_t>(stepCount) * bytes) {
+      failTooSmall(getName());
+    }
+    // All 16 steps are written: the last given vector repeats, vectors past 16 are not used.
+    const uint8_t* vector = value;
+    for (uint32_t step = 0; step < ZinMOX_Command::STEP_COUNT; ++step) {
+      for (uint32_t i = 0; i < n; ++i) {
+        command->setPulseTrainStep(positions[i], step, packedBit(vector, i) ? '1' : '0');
+        command->setSyncOutUpdateChar(positions[i], '1');
+      }
+      if (step + 1 < stepCount) vector += bytes;
+    }
+  } else {
+    if (byteSize < bytes) failTooSmall(getName());
+    for (uint32_t i = 0; i < n; ++i) {
+      command->setAsyncOutValueChar(positions[i], packedBit(value, i) ? '1' : '0');
+      command->setAsyncOutUpdateChar(positions[i], '1');
+    }
+  }
+}
+
+void ZinMOX_SignalGroup::getValues(uint8_t* value, uint8_t* activityUp, uint8_t* activityDown,
+                                   uint8_t* syncActivityUp, uint8_t* syncActivityDown,
+                                   uint32_t byteSize) const {
+  const uint32_t type = mox::plainSignalType(getType());
+  const std::vector<uint32_t>& positions = getPositionVector();
+  const uint32_t n = size();
+  if (byteSize < mox::byteCount(n)) failTooSmall(getName());
+  checkDirection(type, true, getName());
+
+  char level, up, down, syncUp, syncDown;
+  if (type == Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT) {
+    for (uint32_t i = 0; i < n; ++i) {
+      command->getSyncInChars(positions[i], level, up, down, syncUp, syncDown);
+      orPackedBit(value, i, level);
+      orPackedBit(activityUp, i, up);
+      orPackedBit(activityDown, i, down);
+      orPackedBit(syncActivityUp, i, syncUp);
+      orPackedBit(syncActivityDown, i, syncDown);
+    }
+  } else {
+    for (uint32_t i = 0; i < n; ++i) {
+      command->getAsyncInChars(positions[i], level, up, down);
+      orPackedBit(value, i, level);
+      orPackedBit(activityUp, i, up);
+      orPackedBit(activityDown, i, down);
+    }
+  }
+}
+
+}  // namespace ZinRT

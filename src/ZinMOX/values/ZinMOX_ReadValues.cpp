@@ -1,0 +1,109 @@
+// Reading named inputs: every input into a value map, or samples of named inputs into arrays.
+#include <memory>
+#include <stdexcept>
+#include <string>
+
+#include "ZinMOX/ZinMOX_Core.h"
+#include "ZinMOX/ZinMOX_SignalGroup.h"
+#include "framework/ZinMOX_Framework.h"
+
+namespace ZinRT {
+
+namespace {
+
+bool isSyncInput(const ZinMOX_SignalGroup& group) {
+  return mox::plainSignalType(group.getType()) == Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT;
+}
+
+// The hexadecimal text of a signal's packed vector.
+std::string vectorText(const Zin_ByteBuffer& vector, uint32_t width) {
+  std::unique_ptr<Zin_ByteBuffer> text(vector.bin2HexString(0, width));
+  return std::string(text->ptr());
+}
+
+// Writes one signal's value and activity texts under its name and suffixed keys.
+void reportSignal(const ZinMOX_SignalGroup& group, ZinMOX_ValueMap& map) {
+  const uint32_t width = group.size();
+  const uint32_t bytes = mox::byteCount(width);
+  const bool sync = isSyncInput(group);
+  Zin_ByteBuffer value(bytes, 0, 0), up(bytes, 0, 0), down(bytes, 0, 0);
+  Zin_ByteBuffer syncUp(sync ? bytes : 0, 0, 0), syncDown(sync ? bytes : 0, 0, 0);
+  group.getValues(value.uPtr(), up.uPtr(), down.uPtr(), sync ? syncUp.uPtr() : nullptr,
+                  sync ? syncDown.uPtr() : nullptr, bytes);
+
+  const std::string& name = group.getKeyName();
+  std::string valueText = vectorText(value, width);
+  map[name] = valueText;
+  map[name + ".value"] = std::move(valueText);
+  map[name + ".activity_up"] = vectorText(up, width);
+  map[name + ".activity_down"] = vectorText(down, width);
+  if (sync) {
+    map[name + ".sync_activity_up"] = vectorText(syncUp, width);
+    map[name + ".sync_activity_down"] = vectorText(syncDown, width);
+  }
+}
+
+// The cursor of one of the five per-signal buffers (null when the caller gave none).
+uint8_t* bufferOf(uint8_t* const* buffers, uint32_t i) {
+  return buffers == nullptr ? nullptr : buffers[i];
+}
+
+}  // namespace
+
+void ZinMOX_Core::readValues(uint32_t handle, ZIN_CORE_REF coreRef, ZinMOX_ValueMap* inputHashMap) {
+  if (inputHashMap == nullptr) {
+    throw std::logic_error("ZinMOX_Core::readValues() arg. failed:inputHashMap!=0");
+  }
+  command.readInputs(handle, coreRef);
+  for (const auto& entry : inputSignals) reportSignal(*entry.second, *inputHashMap);
+}
+
+void ZinMOX_Core::readValues(uint32_t handle, ZIN_CORE_REF coreRef,
+                             std::vector<std::string> signalNames, uint8_t* const* values,
+                             uint8_t* const* activityUp, uint8_t* const* activityDown,
+                             uint8_t* const* syncActivityUp, uint8_t* const* syncActivityDown,
+                             const uint32_t* valueSizes, uint32_t signalCount,
+                             uint32_t sampleCount) {
+  if (signalCount > signalNames.size()) {
+    throw std::logic_error("ZinMOX_Core::readValues() arg. failed:signalCount<=signalNames.size()");
+  }
+  if (signalCount != 0 && valueSizes == nullptr) {
+    throw std::logic_error("ZinMOX_Core::readValues() arg. failed:valueSizes!=0");
+  }
+  std::vector<ZinMOX_SignalGroup*> groups(signalCount);
+  for (uint32_t i = 0; i < signalCount; ++i) {
+    groups[i] = requireInputSignal(signalNames[i]);
+    if (static_cast<uint64_t>(valueSizes[i]) <
+        static_cast<uint64_t>(mox::byteCount(groups[i]->size())) * sampleCount) {
+      throw std::logic_error("The size of the value is not large enough for the signal: " +
+                             signalNames[i]);
+    }
+  }
+  if (sampleCount == 0) return;
+
+  struct Cursor {
+    uint8_t* buffers[5];
+    uint32_t bytesLeft;
+  };
+  std::vector<Cursor> cursors(signalCount);
+  for (uint32_t i = 0; i < signalCount; ++i) {
+    cursors[i] = {{bufferOf(values, i), bufferOf(activityUp, i), bufferOf(activityDown, i),
+                   bufferOf(syncActivityUp, i), bufferOf(syncActivityDown, i)},
+                  valueSizes[i]};
+  }
+  for (uint32_t sample = 0; sample < sampleCount; ++sample) {
+    command.readInputs(handle, coreRef);
+    for (uint32_t i = 0; i < signalCount; ++i) {
+      Cursor& cursor = cursors[i];
+      groups[i]->getValues(cursor.buffers[0], cursor.buffers[1], cursor.buffers[2],
+                           cursor.buffers[3], cursor.buffers[4], cursor.bytesLeft);
+      const uint32_t step = mox::byteCount(groups[i]->size());
+      for (uint8_t*& buffer : cursor.buffers) {
+        if (buffer != nullptr) buffer += step;
+      }
+      if (cursor.bytesLeft >= step) cursor.bytesLeft -= step;
+    }
+  }
+}
+
+}  // namespace ZinRT
