@@ -49,6 +49,7 @@ int main() {
 
   ZIN_CORE_REF empty{0, 0, 5};
   std::printf("asking for the information of an empty reference reports:\n");
+  std::fflush(stdout);
   ZinMOX_getInfo(handle, &empty, &info);
   ZinJtag_closeSession(handle);
   return 0;
