@@ -1,0 +1,196 @@
+// JTAG sessions: handles, messages, the re-entrant target lock, and closing.
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <future>
+#include <memory>
+#include <mutex>
+#include <stdexcept>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "ZinRT/ZinJtag.h"
+#include "ZinTarget/ScriptedTransport.h"
+
+namespace {
+
+struct Received {
+  uint32_t handle;
+  uint32_t code;
+  std::string text;
+};
+
+struct Inbox {
+  std::mutex mutex;
+  std::vector<Received> messages;
+
+  static void handler(void* user, uint32_t handle, uint32_t code, const char* text) {
+    auto* inbox = static_cast<Inbox*>(user);
+    std::lock_guard<std::mutex> guard(inbox->mutex);
+    inbox->messages.push_back({handle, code, text});
+  }
+};
+
+uint32_t openScripted() {
+  return ZinJtag_openSession(std::make_shared<ZinTarget::ScriptedTransport>());
+}
+
+std::string whatOf(const std::function<void()>& call) {
+  try {
+    call();
+  } catch (const std::exception& e) {
+    return e.what();
+  }
+  return "";
+}
+
+}  // namespace
+
+TEST(JtagSession, HandlesAreDistinctAndUnknownHandlesAreRejected) {
+  const uint32_t a = openScripted();
+  const uint32_t b = openScripted();
+  EXPECT_NE(a, 0u);
+  EXPECT_NE(b, 0u);
+  EXPECT_NE(a, b);
+  EXPECT_THROW(ZinJtag_openSession(nullptr), std::invalid_argument);
+  ZinJtag_closeSession(a);
+  EXPECT_THROW(ZinJtag_closeSession(a), std::invalid_argument);
+  EXPECT_THROW(ZinJtag_session_sendMessage(a, ZINJTAG_MSG_ERROR, "x"), std::invalid_argument);
+  EXPECT_THROW(ZinJtag_target_flush(a), std::invalid_argument);
+  EXPECT_THROW(ZinJtagTargetLock(a, 10), std::invalid_argument);
+  EXPECT_THROW(ZinJtag_session_isLocked(a), std::invalid_argument);
+  EXPECT_NE(whatOf([a] { ZinJtag_session_sendMessage(a, 1, "x"); }).find(std::to_string(a)),
+            std::string::npos);
+  ZinJtag_closeSession(b);
+}
+
+TEST(JtagSession, MessagesReachTheirOwnSessionInOrder) {
+  const uint32_t a = openScripted();
+  const uint32_t b = openScripted();
+  Inbox inboxA;
+  Inbox inboxB;
+  ZinJtag_setMessageHandler(a, &Inbox::handler, &inboxA);
+  ZinJtag_setMessageHandler(b, &Inbox::handler, &inboxB);
+  ZinJtag_session_sendMessage(a, ZINJTAG_MSG_ERROR, "first");
+  ZinJtag_session_sendMessage(b, ZINJTAG_MSG_ABORT, "other");
+  ZinJtag_session_sendMessage(a, ZINJTAG_MSG_ABORT, "second");
+  ZinJtag_session_sendMessage(a, ZINJTAG_MSG_ERROR, nullptr);
+
+  ASSERT_EQ(inboxA.messages.size(), 3u);
+  EXPECT_EQ(inboxA.messages[0].text, "first");
+  EXPECT_EQ(inboxA.messages[0].code, ZINJTAG_MSG_ERROR);
+  EXPECT_EQ(inboxA.messages[1].text, "second");
+  EXPECT_EQ(inboxA.messages[1].code, ZINJTAG_MSG_ABORT);
+  EXPECT_EQ(inboxA.messages[2].text, "");
+  for (const auto& m : inboxA.messages) EXPECT_EQ(m.handle, a);
+  ASSERT_EQ(inboxB.messages.size(), 1u);
+  EXPECT_EQ(inboxB.messages[0].text, "other");
+  EXPECT_EQ(inboxB.messages[0].handle, b);
+
+  // A null handler restores the default one, which writes to standard error.
+  ZinJtag_setMessageHandler(a, nullptr, nullptr);
+  testing::internal::CaptureStderr();
+  ZinJtag_session_sendMessage(a, 0x100, "to stderr");
+  const std::string err = testing::internal::GetCapturedStderr();
+  EXPECT_EQ(err, "ZinJtag[" + std::to_string(a) + "] code 0x0100: to stderr\n");
+  EXPECT_EQ(inboxA.messages.size(), 3u);
+  ZinJtag_closeSession(a);
+  ZinJtag_closeSession(b);
+}
+
+TEST(JtagSession, TargetLockIsReentrantAndCounted) {
+  const uint32_t h = openScripted();
+  EXPECT_FALSE(ZinJtag_session_isLocked(h));
+  EXPECT_EQ(ZinJtag_session_lockCount(h), 0u);
+  {
+    ZinJtagTargetLock outer(h, 60000);
+    EXPECT_TRUE(ZinJtag_session_isLocked(h));
+    {
+      ZinJtagTargetLock inner(h, 0);  // re-entry does not wait, even with no time to wait
+      EXPECT_TRUE(ZinJtag_session_isLocked(h));
+    }
+    EXPECT_TRUE(ZinJtag_session_isLocked(h));
+  }
+  EXPECT_FALSE(ZinJtag_session_isLocked(h));
+  EXPECT_EQ(ZinJtag_session_lockCount(h), 2u);
+  ZinJtag_closeSession(h);
+}
+
+TEST(JtagSession, TargetLockTimesOutForAnotherThreadAndIsTakenAfterRelease) {
+  const uint32_t h = openScripted();
+  auto held = std::make_unique<ZinJtagTargetLock>(h, 60000);
+  const std::string failure = std::async(std::launch::async, [h] {
+                                return whatOf([h] { ZinJtagTargetLock lock(h, 50); });
+                              }).get();
+  EXPECT_EQ(failure,
+            "ZinJtag: target lock of session " + std::to_string(h) + " not obtained within 50 ms");
+
+  // A waiter gets the lock once the holder lets go.
+  std::promise<void> started;
+  auto waiter = std::async(std::launch::async, [h, &started] {
+    started.set_value();
+    ZinJtagTargetLock lock(h, 60000);
+    return ZinJtag_session_isLocked(h);
+  });
+  started.get_future().wait();
+  held.reset();
+  EXPECT_TRUE(waiter.get());
+  EXPECT_FALSE(ZinJtag_session_isLocked(h));
+  ZinJtag_closeSession(h);
+}
+
+TEST(JtagSession, TransfersGoThroughTheSessionTransport) {
+  auto transport = std::make_shared<ZinTarget::ScriptedTransport>();
+  const uint32_t h = ZinJtag_openSession(transport);
+  ZinJtag_target_flush(h);
+  ZinJtag_target_flush(h);
+  EXPECT_EQ(transport->flushCount(), 2u);
+  ZinRT::Zin_Transport* seen = nullptr;
+  ZinJtag_session_withTransport(h, [&seen](ZinRT::Zin_Transport& t) { seen = &t; });
+  EXPECT_EQ(seen, transport.get());
+  EXPECT_THROW(ZinJtag_session_withTransport(
+                   h, [](ZinRT::Zin_Transport&) { throw std::runtime_error("work failed"); }),
+               std::runtime_error);
+  ZinJtag_closeSession(h);
+}
+
+TEST(JtagSession, SessionClosedWhileLockedStaysValidForTheLock) {
+  auto transport = std::make_shared<ZinTarget::ScriptedTransport>();
+  std::weak_ptr<ZinTarget::ScriptedTransport> watch = transport;
+  const uint32_t h = ZinJtag_openSession(std::move(transport));
+  {
+    ZinJtagTargetLock lock(h, 1000);
+    ZinJtag_closeSession(h);
+    EXPECT_THROW(ZinJtag_session_isLocked(h), std::invalid_argument);
+    EXPECT_FALSE(watch.expired());  // the lock still holds the session
+  }
+  EXPECT_TRUE(watch.expired());  // released with the last lock
+}
+
+namespace {
+std::vector<uint32_t> closedHandles;
+std::vector<bool> openDuringHook;
+void recordClose(uint32_t handle) {
+  closedHandles.push_back(handle);
+  bool open = true;
+  try {
+    ZinJtag_session_isLocked(handle);
+  } catch (const std::invalid_argument&) {
+    open = false;
+  }
+  openDuringHook.push_back(open);
+}
+}  // namespace
+
+TEST(JtagSession, CloseHooksRunOnceWhileTheSessionIsStillOpen) {
+  ZinJtag_addSessionCloseHook(&recordClose);
+  ZinJtag_addSessionCloseHook(&recordClose);  // registered once
+  closedHandles.clear();
+  openDuringHook.clear();
+  const uint32_t h = openScripted();
+  ZinJtag_closeSession(h);
+  EXPECT_EQ(closedHandles, std::vector<uint32_t>{h});
+  EXPECT_EQ(openDuringHook, std::vector<bool>{true});
+  EXPECT_THROW(ZinJtag_addSessionCloseHook(nullptr), std::invalid_argument);
+}
