@@ -1,0 +1,193 @@
+// The core list (ownership, replacement, session close) and status reads and command sequences
+// through a session's transport.
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <cstring>
+#include <memory>
+#include <stdexcept>
+#include <thread>
+#include <vector>
+
+#include "ZinRT/ZinJtag.h"
+#include "ZinRT/Zin_CoreComm.h"
+#include "ZinRT/Zin_CoreList.h"
+#include "ZinRT/Zin_Signal.h"
+#include "ZinRT/Zin_SignalCore.h"
+#include "ZinRT/Zin_SignalGroup.h"
+#include "ZinTarget/ScriptedTransport.h"
+
+using ZinRT::Zin_Core;
+using ZinRT::Zin_CoreList;
+using ZinTarget::ScriptedTransport;
+
+namespace {
+
+std::atomic<int> destroyed{0};
+
+class CountedCore : public Zin_Core {
+ public:
+  CountedCore(uint32_t handle, ZIN_CORE_REF ref)
+      : Zin_Core(handle, ref, ZIN_CORE_INFO{1, 2, 3, 4, 5}) {}
+  ~CountedCore() override { ++destroyed; }
+};
+
+class CoreListTest : public ::testing::Test {
+ protected:
+  void SetUp() override {
+    transport = std::make_shared<ScriptedTransport>();
+    handle = ZinJtag_openSession(transport);
+    destroyed = 0;
+  }
+  void TearDown() override {
+    if (handle != 0) ZinJtag_closeSession(handle);
+  }
+  std::shared_ptr<ScriptedTransport> transport;
+  uint32_t handle = 0;
+};
+
+}  // namespace
+
+TEST_F(CoreListTest, AddReplaceAndRemoveOwnTheCores) {
+  const ZIN_CORE_REF ref{1, 2, 3};
+  auto* first = new CountedCore(handle, ref);
+  Zin_CoreList::addCore(handle, first);
+  EXPECT_EQ(Zin_CoreList::getCore(handle, ref), first);
+  EXPECT_EQ(Zin_CoreList::getCore(handle, ZIN_CORE_REF{1, 2, 4}), nullptr);
+  EXPECT_EQ(Zin_CoreList::getCore(handle + 1000, ref), nullptr);
+
+  Zin_CoreList::addCore(handle, first);  // again at its own place: kept
+  EXPECT_EQ(destroyed, 0);
+  auto* second = new CountedCore(handle, ref);
+  Zin_CoreList::addCore(handle, second);  // replaces and destroys the first
+  EXPECT_EQ(destroyed, 1);
+  EXPECT_EQ(Zin_CoreList::getCore(handle, ref), second);
+  EXPECT_EQ(Zin_CoreList::coreCount(handle), 1u);
+  EXPECT_THROW(Zin_CoreList::addCore(handle, nullptr), std::invalid_argument);
+
+  Zin_Core* removed = second;
+  Zin_CoreList::removeCore(handle + 1000, &removed);  // not registered on that session
+  EXPECT_EQ(removed, nullptr);
+  EXPECT_EQ(destroyed, 1);
+  removed = second;
+  Zin_CoreList::removeCore(handle, &removed);
+  EXPECT_EQ(removed, nullptr);
+  EXPECT_EQ(destroyed, 2);
+  EXPECT_EQ(Zin_CoreList::getCore(handle, ref), nullptr);
+  EXPECT_THROW(Zin_CoreList::removeCore(handle, nullptr), std::invalid_argument);
+}
+
+TEST_F(CoreListTest, ClosingASessionDestroysOnlyItsCores) {
+  auto other = std::make_shared<ScriptedTransport>();
+  const uint32_t otherHandle = ZinJtag_openSession(other);
+  Zin_CoreList::addCore(handle, new CountedCore(handle, ZIN_CORE_REF{0, 0, 0}));
+  Zin_CoreList::addCore(handle, new CountedCore(handle, ZIN_CORE_REF{0, 0, 1}));
+  Zin_CoreList::addCore(otherHandle, new CountedCore(otherHandle, ZIN_CORE_REF{0, 0, 0}));
+  EXPECT_EQ(Zin_CoreList::coreCount(handle), 2u);
+
+  ZinJtag_closeSession(handle);
+  handle = 0;
+  EXPECT_EQ(destroyed, 2);
+  EXPECT_EQ(Zin_CoreList::coreCount(otherHandle), 1u);
+  ZinJtag_closeSession(otherHandle);
+  EXPECT_EQ(destroyed, 3);
+}
+
+TEST_F(CoreListTest, ConcurrentAddsAndLookupsKeepEveryCore) {
+  std::vector<std::thread> threads;
+  for (uint32_t t = 0; t < 4; ++t) {
+    threads.emplace_back([this, t] {
+      for (uint32_t i = 0; i < 50; ++i) {
+        const ZIN_CORE_REF ref{t, 0, i};
+        Zin_CoreList::addCore(handle, new CountedCore(handle, ref));
+        EXPECT_NE(Zin_CoreList::getCore(handle, ref), nullptr);
+      }
+    });
+  }
+  for (auto& thread : threads) thread.join();
+  EXPECT_EQ(Zin_CoreList::coreCount(handle), 200u);
+  Zin_CoreList::removeSessionCores(handle);
+  EXPECT_EQ(destroyed, 200);
+}
+
+TEST_F(CoreListTest, StatusReadFillsInfoAndTheAskedBits) {
+  const ZIN_CORE_REF ref{1, 0, 2};
+  transport->placeCore(ref, ZIN_CORE_INFO{7, 9, 10, 0, 3}, {0xFF, 0xFF, 0xFF});
+  ZIN_CORE_INFO info{};
+  ZinRT::Zin_ByteBuffer status(4, 0, 0);
+  status[3] = 0x55;
+  ZinRT::Zin_CoreComm::getCoreStatus(handle, ref, &info, status, 12);
+  EXPECT_EQ(info.manufacturerId, 7u);
+  EXPECT_EQ(info.coreType, 9u);
+  EXPECT_EQ(info.coreRevision, 3u);
+  EXPECT_EQ(status.getBits(0, 32), 0x0FFFu);  // 12 bits, the rest zeroed
+
+  ZinRT::Zin_CoreComm::getCoreStatus(handle, ZIN_CORE_REF{3, 3, 3}, &info, status, 32);
+  EXPECT_EQ(info.coreType, 0u);
+  EXPECT_EQ(status.getBits(0, 32), 0u);
+
+  // The C entry point reports failures as a status instead of throwing.
+  unsigned char bytes[2] = {0xAA, 0xAA};
+  EXPECT_EQ(ZinCore_getCoreStatus(handle, ref, &info, bytes, 10), 0u);
+  EXPECT_EQ(bytes[0], 0xFF);
+  EXPECT_EQ(bytes[1], 0x03);
+  EXPECT_EQ(ZinCore_getCoreStatus(handle, ref, &info, nullptr, 0), 0u);
+  EXPECT_EQ(info.manufacturerId, 7u);
+  transport->failNextStatusRead(ScriptedTransport::Failure::NonStandard);
+  EXPECT_EQ(ZinCore_getCoreStatus(handle, ref, &info, nullptr, 0), 0x80000000u);
+  EXPECT_EQ(info.coreType, 0u);
+  EXPECT_EQ(ZinCore_getCoreStatus(handle + 1000, ref, &info, nullptr, 0), 0x80000000u);
+}
+
+namespace {
+std::vector<uint32_t> progressCalls;
+ZIN_PROGRESS_RETURN onProgress(uint32_t done, uint32_t all, uint32_t bits,
+                               ZIN_PROGRESS_STATUS status) {
+  progressCalls = {done, all, bits, static_cast<uint32_t>(status)};
+  return ZIN_PROGRESS_CONTINUE;
+}
+}  // namespace
+
+TEST_F(CoreListTest, CommandSequenceDeliversReadDataAndFailures) {
+  transport->queueReadData({0x12, 0x34, 0x56});
+  unsigned char read[2] = {0xEE, 0xEE};
+  ZinRT::Zin_CoreComm::commandSequence(handle, "a\nb", read, 16, &onProgress);
+  EXPECT_EQ(read[0], 0x12);
+  EXPECT_EQ(read[1], 0x34);
+  EXPECT_EQ(progressCalls, (std::vector<uint32_t>{2, 2, 16, ZIN_PROGRESS_DONE}));
+  ASSERT_EQ(transport->transfers().size(), 1u);
+  EXPECT_EQ(transport->transfers()[0].text, "a\nb");
+  EXPECT_EQ(transport->transfers()[0].readBitCount, 16u);
+
+  EXPECT_THROW(ZinRT::Zin_CoreComm::commandSequence(handle, "x", nullptr, 8, nullptr),
+               std::invalid_argument);
+  transport->failNextCommand(ScriptedTransport::Failure::Runtime, "broken");
+  EXPECT_THROW(ZinRT::Zin_CoreComm::commandSequence(handle, "y", nullptr, 0, nullptr),
+               std::runtime_error);
+  EXPECT_EQ(transport->transfers().size(), 1u);
+}
+
+TEST(SignalCore, KeepsStatusCountsAndSignals) {
+  const unsigned char status[] = {0xAB, 0xCD, 0xEF};
+  ZinRT::Zin_SignalCore core(1, ZIN_CORE_REF{0, 0, 0}, ZIN_CORE_INFO{}, status, 12);
+  EXPECT_EQ(core.getStatusBuffer().getSize(), 2u);
+  EXPECT_EQ(core.getStatusBuffer().getBits(0, 16), 0xCDABu);
+  EXPECT_EQ(core.getCorePhysicalSignalCount(ZinRT::Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT), 0u);
+  core.setCorePhysicalSignalCount(ZinRT::Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT, 5);
+  EXPECT_EQ(core.getCorePhysicalSignalCount(ZinRT::Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT), 5u);
+
+  std::vector<uint32_t> positions{5, 2, 9};
+  ZinRT::Zin_SignalGroup group(ZinRT::Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_OUTPUT, 0, positions,
+                               "bus");
+  EXPECT_EQ(group.getType() & ~ZinRT::Zin_SignalBase::SIGNAL_TYPE_GROUP,
+            ZinRT::Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_OUTPUT);
+  ZinRT::Zin_Signal single(ZinRT::Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_INPUT, 3, 0, "led");
+  core.addSignal(&group);
+  core.addSignal(&single);
+  EXPECT_EQ(core.getSignal("bus", group.getType(), 0), &group);
+  EXPECT_EQ(core.getSignal("led", single.getType(), 3), &single);
+  EXPECT_EQ(core.getSignal("led", single.getType(), 4), nullptr);
+  core.removeSignal(&single);
+  EXPECT_EQ(core.getSignal("led", single.getType(), 3), nullptr);
+  EXPECT_THROW(core.addSignal(nullptr), std::invalid_argument);
+}
