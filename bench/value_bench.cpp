@@ -1,0 +1,143 @@
+// Named writes and reads through value maps, and the fitting of value texts.
+#include <benchmark/benchmark.h>
+
+#include <cstdint>
+#include <memory>
+#include <string>
+
+#include "BenchSession.h"
+#include "ZinMOX/ZinMOX_ValueMap.h"
+#include "values/ZinMOX_HexText.h"
+
+namespace ZinBench {
+
+namespace {
+
+using ZinRT::ZinMOX_ValueMap;
+
+constexpr uint32_t kSmallWidth = 8;
+constexpr uint32_t kSmallBus[kSmallWidth] = {0, 1, 2, 3, 4, 5, 6, 7};
+
+uintptr_t mapWord(ZinMOX_ValueMap& map) { return reinterpret_cast<uintptr_t>(&map); }
+
+// A hexadecimal text of `digits` digits in an irregular pattern.
+std::string hexText(size_t digits, uint32_t seed) {
+  static constexpr char kDigits[] = "0123456789ABCDEF";
+  std::string text(digits, '0');
+  uint32_t x = seed * 2654435761u + 1;
+  for (char& c : text) {
+    x = x * 1664525u + 1013904223u;
+    c = kDigits[x >> 28];
+  }
+  return text;
+}
+
+void BM_SmallNamedWrite(benchmark::State& state) {
+  BenchSession session(state, kSmallWidth);
+  if (!session.check(ZinMOX_defineBus(session.handle(), session.ref(), "ctl", ZINMOX_ASYNC_OUTPUT,
+                                      kSmallBus, kSmallWidth),
+                     "ZinMOX_defineBus")) {
+    return;
+  }
+  ZinMOX_ValueMap map{{"ctl", "3F"}};
+  uintptr_t word = mapWord(map);
+  for (auto _ : state) {
+    if (!session.check(ZinMOX_writeValues(session.handle(), session.ref(), &word),
+                       "ZinMOX_writeValues")) {
+      break;
+    }
+  }
+  setWireBits(state, writeWireBits(kSmallWidth, kSmallWidth));
+}
+
+void BM_SmallNamedRead(benchmark::State& state) {
+  BenchSession session(state, kSmallWidth);
+  if (!session.check(ZinMOX_defineBus(session.handle(), session.ref(), "st", ZINMOX_ASYNC_INPUT,
+                                      kSmallBus, kSmallWidth),
+                     "ZinMOX_defineBus")) {
+    return;
+  }
+  ZinMOX_ValueMap map;
+  uintptr_t word = mapWord(map);
+  for (auto _ : state) {
+    if (!session.check(ZinMOX_readValues(session.handle(), session.ref(), &word),
+                       "ZinMOX_readValues")) {
+      break;
+    }
+  }
+  setWireBits(state, readWireBits(kSmallWidth, kSmallWidth));
+}
+
+// Every output of the core through the map: the two whole-port signals, plain values.
+void BM_MapWriteAllOutputs(benchmark::State& state) {
+  const auto width = static_cast<uint32_t>(state.range(0));
+  BenchSession session(state, width);
+  const size_t digits = (width + 3) / 4;
+  ZinMOX_ValueMap map{{"async_out_data", hexText(digits, 1)},
+                      {"sync_out_data", hexText(digits, 2)}};
+  uintptr_t word = mapWord(map);
+  for (auto _ : state) {
+    if (!session.check(ZinMOX_writeValues(session.handle(), session.ref(), &word),
+                       "ZinMOX_writeValues")) {
+      break;
+    }
+  }
+  setWireBits(state, writeWireBits(width, width));
+}
+
+// Every input of the core into the map: the two whole-port signals with their activity.
+void BM_MapReadAllInputs(benchmark::State& state) {
+  const auto width = static_cast<uint32_t>(state.range(0));
+  BenchSession session(state, width);
+  ZinMOX_ValueMap map;
+  uintptr_t word = mapWord(map);
+  for (auto _ : state) {
+    if (!session.check(ZinMOX_readValues(session.handle(), session.ref(), &word),
+                       "ZinMOX_readValues")) {
+      break;
+    }
+  }
+  setWireBits(state, readWireBits(width, width));
+}
+
+// A 16-step pulse train of the whole synchronous output port through the map.
+void BM_MapWritePulseTrain(benchmark::State& state) {
+  const auto width = static_cast<uint32_t>(state.range(0));
+  BenchSession session(state, width);
+  ZinMOX_ValueMap map{{"sync_out_data.pulsetrain", hexText(32 * ((width + 7) / 8), 3)}};
+  uintptr_t word = mapWord(map);
+  for (auto _ : state) {
+    if (!session.check(ZinMOX_writeValues(session.handle(), session.ref(), &word),
+                       "ZinMOX_writeValues")) {
+      break;
+    }
+  }
+  setWireBits(state, writeWireBits(width, width));
+}
+
+// Fitting and converting a long pulse-train text alone (256 bits per byte of a `width`-bit
+// signal), the value-text part of a pulse-train write. Related to the write of that many
+// synchronous output bits.
+void BM_FitPulseTrainText(benchmark::State& state) {
+  const auto width = static_cast<uint32_t>(state.range(0));
+  const uint32_t bits = 256 * ((width + 7) / 8);
+  const std::string text = hexText(bits / 4 - 3, 4);  // shorter: the fill path is taken
+  for (auto _ : state) {
+    std::unique_ptr<ZinRT::Zin_ByteBuffer> fitted =
+        ZinRT::mox::fitHexString(text.c_str(), static_cast<int32_t>(bits));
+    std::unique_ptr<ZinRT::Zin_ByteBuffer> bytes(fitted->hex2Bin(0, fitted->getSize() - 2));
+    benchmark::DoNotOptimize(bytes->uPtr());
+  }
+  setWireBits(state, writeWireBits(0, width));
+}
+
+}  // namespace
+
+BENCHMARK(BM_SmallNamedWrite);
+BENCHMARK(BM_SmallNamedRead);
+BENCHMARK(BM_MapWriteAllOutputs)->Arg(64)->Arg(1024)->Arg(16384)->Arg(65535);
+BENCHMARK(BM_MapReadAllInputs)->Arg(64)->Arg(1024)->Arg(16384)->Arg(65535);
+BENCHMARK(BM_MapWritePulseTrain)->Arg(1024)->Arg(65535);
+BENCHMARK(BM_FitPulseTrainText)->Arg(1024)->Arg(65535);
+
+}  // namespace ZinBench

@@ -1,0 +1,134 @@
+#!/usr/bin/env python3
+"""Runs the benchmark suite and relates each case to the JTAG wire time of the bits it moves.
+
+For every case it prints the library's CPU time per call (mean over the repetitions, with the
+coefficient of variation as the machine's noise) and its ratio to the wire time N / 30e6 s, where
+N is the number of bits the call shifts (each benchmark records N as its "wire_bits" counter):
+
+  write (setPortBits, map writes):  2*A_out + 17*S_out + 1  (the write line)  + 4 (the code-02 line)
+  read  (getPortBits, map reads):   4*A_in + 6*S_in + 16     (the read line)   + 4 (the code-04 line)
+
+A_in, S_in, A_out, S_out are the core's port widths (all equal to the case's width here). The
+pulse-train text fitting is related to the write of a synchronous port of that width.
+
+Targets checked (cases of 1024 bits per port or more): setPortBits and getPortBits at most 1% of
+the wire time, map writes of every output and map reads of every input at most 3%; a named write
+or read on the small core (8 bits per port) at most 2 us.
+
+Usage: scripts/bench.py [--build-dir DIR] [--repetitions N] [--filter REGEX] [--min-time S]
+Builds the suite first when the build directory does not hold it yet (release configuration).
+"""
+import argparse
+import json
+import os
+import subprocess
+import sys
+
+TCK_HZ = 30e6
+ROOT = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
+
+# (benchmark name prefix, limit, kind): kind "ratio" limits cpu/wire for widths >= 1024,
+# kind "time" limits the CPU time per call in seconds.
+TARGETS = [
+    ("BM_SetPortBits/", 0.01, "ratio"),
+    ("BM_GetPortBits/", 0.01, "ratio"),
+    ("BM_MapWriteAllOutputs/", 0.03, "ratio"),
+    ("BM_MapReadAllInputs/", 0.03, "ratio"),
+    ("BM_SmallNamedWrite", 2e-6, "time"),
+    ("BM_SmallNamedRead", 2e-6, "time"),
+]
+
+
+def build(build_dir):
+    exe = os.path.join(build_dir, "bin", "zin_bench")
+    if os.path.exists(exe):
+        return exe
+    subprocess.run(["cmake", "-S", ROOT, "-B", build_dir, "-DCMAKE_BUILD_TYPE=Release",
+                    "-DPython3_EXECUTABLE=" + sys.executable, "-DZINMOX_BUILD_BENCHMARKS=ON",
+                    "-DZINMOX_BUILD_TESTS=OFF", "-DZINMOX_BUILD_PYTHON=OFF",
+                    "-DZINMOX_BUILD_TOOLS=OFF"], check=True)
+    subprocess.run(["cmake", "--build", build_dir, "-j2", "--target", "zin_bench"], check=True)
+    return exe
+
+
+def run(exe, repetitions, name_filter, min_time):
+    cmd = [exe, "--benchmark_format=json", "--benchmark_repetitions=%d" % repetitions,
+           "--benchmark_report_aggregates_only=true", "--benchmark_min_time=%g" % min_time]
+    if name_filter:
+        cmd.append("--benchmark_filter=" + name_filter)
+    out = subprocess.run(cmd, check=True, stdout=subprocess.PIPE).stdout
+    return json.loads(out)["benchmarks"]
+
+
+def seconds(entry):
+    scale = {"ns": 1e-9, "us": 1e-6, "ms": 1e-3, "s": 1.0}[entry.get("time_unit", "ns")]
+    return entry["cpu_time"] * scale
+
+
+def collect(benchmarks):
+    cases = {}
+    for b in benchmarks:
+        name = b.get("run_name", b["name"])
+        agg = b.get("aggregate_name", "mean")
+        if b.get("error_occurred"):
+            cases.setdefault(name, {})["error"] = b.get("error_message", "error")
+            continue
+        case = cases.setdefault(name, {})
+        case[agg] = seconds(b)
+        if agg == "mean":
+            case["wire_bits"] = b.get("wire_bits", 0)
+    return cases
+
+
+def target_of(name):
+    for prefix, limit, kind in TARGETS:
+        if name.startswith(prefix):
+            if kind == "ratio":
+                width = int(name.split("/")[1])
+                if width < 1024:
+                    return None
+            return limit, kind
+    return None
+
+
+def report(cases):
+    print("%-28s %12s %7s %12s %9s  %s" % ("case", "cpu/call", "noise", "wire time", "ratio",
+                                          "target"))
+    failed = 0
+    for name, c in cases.items():
+        if "error" in c:
+            print("%-28s ERROR %s" % (name, c["error"]))
+            failed += 1
+            continue
+        mean = c.get("mean", 0.0)
+        noise = c.get("stddev", 0.0) / mean if mean else 0.0
+        wire = c["wire_bits"] / TCK_HZ
+        ratio = mean / wire if wire else float("nan")
+        verdict = ""
+        target = target_of(name)
+        if target:
+            limit, kind = target
+            ok = (ratio <= limit) if kind == "ratio" else (mean <= limit)
+            verdict = ("ok " if ok else "FAIL ") + ("<= %g%%" % (limit * 100) if kind == "ratio"
+                                                    else "<= %g us" % (limit * 1e6))
+            failed += 0 if ok else 1
+        print("%-28s %9.3f us %6.1f%% %9.1f us %8.3f%%  %s" % (name, mean * 1e6, noise * 100,
+                                                               wire * 1e6, ratio * 100, verdict))
+    return failed
+
+
+def main():
+    parser = argparse.ArgumentParser(description=__doc__.split("\n")[0])
+    parser.add_argument("--build-dir", default=os.path.join(ROOT, "build", "bench"))
+    parser.add_argument("--repetitions", type=int, default=5)
+    parser.add_argument("--filter", default="")
+    parser.add_argument("--min-time", type=float, default=0.2)
+    args = parser.parse_args()
+    exe = build(args.build_dir)
+    failed = report(collect(run(exe, args.repetitions, args.filter, args.min_time)))
+    print("targets missed: %d" % failed)
+    return 1 if failed else 0
+
+
+if __name__ == "__main__":
+    sys.exit(main())
