@@ -1,0 +1,184 @@
+// Target descriptions: the JSON format, its error reports and the demo design.
+#include <gtest/gtest.h>
+
+#include <fstream>
+
+#include "SimTestUtil.h"
+#include "ZinSim/DescriptionJson.h"
+
+namespace {
+
+using ZinSim::DescriptionError;
+
+// A description with one chain whose first core is `core` (JSON text).
+std::string withCore(const std::string& core) {
+  return R"({"devices": [{"index": 1, "chains": [{"number": 2, "cores": [)" + core + "]}]}]}";
+}
+
+TEST(Description, ReadsEveryFieldOfACore) {
+  const ZinSim::TargetDescription d = ZinSim::parseDescription(withCore(R"({
+      "index": 7, "name": "probe", "manufacturer_id": "0x1A5", "type": 9,
+      "major_version": 10, "minor_version": 3, "revision": 4,
+      "qx_version": {"major": 2, "minor": 17, "alpha": 1},
+      "async_inputs": 5, "sync_inputs": 6, "async_outputs": 3, "sync_outputs": 2,
+      "clock": {"cycles_per_sequence": 0},
+      "wiring": [{"input": "sync", "first": 4, "count": 2,
+                  "source": {"kind": "square", "period": 10, "phase": 3}}]})"));
+  ASSERT_EQ(d.cores.size(), 1u);
+  const ZinSim::CoreDescription& c = d.cores[0];
+  EXPECT_EQ(c.ref.deviceIndex, 1u);
+  EXPECT_EQ(c.ref.userChainNumber, 2u);
+  EXPECT_EQ(c.ref.coreIndex, 7u);
+  EXPECT_EQ(c.manufacturerId, 0x1A5u);
+  EXPECT_EQ(c.qxMinorVersion, 17u);
+  EXPECT_EQ(c.syncInputs, 6u);
+  EXPECT_EQ(c.cyclesPerSequence, 0u);
+  ASSERT_EQ(c.wiring.size(), 1u);
+  EXPECT_EQ(c.wiring[0].source.kind, ZinSim::InputSource::Kind::Square);
+  EXPECT_EQ(c.wiring[0].source.phase, 3u);
+  // The nlohmann overload reads the same.
+  const auto again = ZinSim::descriptionFromJson(nlohmann::json::parse(withCore(R"({"type": 3})")));
+  EXPECT_EQ(again.cores[0].type, 3u);
+}
+
+TEST(Description, EveryProblemIsNamedByItsPointer) {
+  struct Case {
+    std::string json;
+    std::string pointer;
+    std::string problem;
+  };
+  const std::string core = "/devices/0/chains/0/cores/0";
+  const std::vector<Case> cases = {
+      {"{", "", "not valid JSON"},
+      {"[]", "", "expected an object, found array"},
+      {"{}", "/devices", "missing"},
+      {R"({"devices": {}})", "/devices", "expected an array, found object"},
+      {R"({"devices": [], "extra": 1})", "/extra", "unknown key"},
+      {R"({"devices": [{"index": 256}]})", "/devices/0/index",
+       "expected a number from 0 to 255, found 256"},
+      {R"({"devices": [{"index": -1}]})", "/devices/0/index", "found -1"},
+      {R"({"devices": [{"index": 3}, {"index": 3}]})", "/devices/1/index",
+       "device 3 is described twice"},
+      {R"({"devices": [{"chains": [{"number": 16}]}]})", "/devices/0/chains/0/number",
+       "from 0 to 15"},
+      {R"({"devices": [{"chains": [{}, {"number": 0}]}]})", "/devices/0/chains/1/number",
+       "user chain 0 is described twice"},
+      {R"({"devices": [{"chains": [{"cores": [{"index": 1}, {}]}]}]})",
+       "/devices/0/chains/0/cores/1", "core 1 is described twice"},
+      {withCore(R"({"async_inputs": "many"})"), core + "/async_inputs",
+       "expected a number, found string"},
+      {withCore(R"({"async_inputs": 70000})"), core + "/async_inputs", "from 0 to 65535"},
+      {withCore(R"({"major_version": 5, "sync_outputs": 256})"), core + "/sync_outputs",
+       "does not fit the status word of version 5.0 (at most 255)"},
+      {withCore(R"({"major_version": 9, "qx_version": {"major": 1}})"), core + "/qx_version",
+       "needs core version 10.0"},
+      {withCore(R"({"qx_version": {"major": 16}})"), core + "/qx_version/major", "from 0 to 15"},
+      {withCore(R"({"qx_version": {"beta": 1}})"), core + "/qx_version/beta", "unknown key"},
+      {withCore(R"({"clock": {"cycles_per_sequence": 1.5}})"), core + "/clock/cycles_per_sequence",
+       "expected a number, found number"},
+      {withCore(R"({"wiring": {}})"), core + "/wiring", "expected an array"},
+      {withCore(R"({"wiring": [{"source": {"kind": "constant"}}]})"), core + "/wiring/0/input",
+       "missing; expected \"async\" or \"sync\""},
+      {withCore(
+           R"({"async_inputs": 2, "wiring": [{"input": "async", "first": 1, "count": 2, "source": {"kind": "constant"}}]})"),
+       core + "/wiring/0/count", "input bits 1 to 2 are not all below async_inputs (2)"},
+      {withCore(R"({"async_inputs": 2, "wiring": [{"input": "async"}]})"),
+       core + "/wiring/0/source", "missing"},
+      {withCore(
+           R"({"async_inputs": 2, "wiring": [{"input": "async", "source": {"kind": "noise"}}]})"),
+       core + "/wiring/0/source/kind",
+       "expected \"constant\" or \"loopback\" or \"counter\" or \"square\", found \"noise\""},
+      {withCore(
+           R"({"async_inputs": 2, "wiring": [{"input": "async", "source": {"kind": "constant", "value": 2}}]})"),
+       core + "/wiring/0/source/value", "from 0 to 1"},
+      {withCore(
+           R"({"async_inputs": 2, "async_outputs": 1, "wiring": [{"input": "async", "count": 2, "source": {"kind": "loopback", "output": "async"}}]})"),
+       core + "/wiring/0/source/bit", "output bits 0 to 1 are not all below async_outputs (1)"},
+      {withCore(
+           R"({"sync_inputs": 2, "wiring": [{"input": "sync", "count": 2, "source": {"kind": "counter", "bit": 62}}]})"),
+       core + "/wiring/0/source/bit", "counter bits 62 to 63"},
+      {withCore(
+           R"({"sync_inputs": 2, "wiring": [{"input": "sync", "source": {"kind": "square"}}]})"),
+       core + "/wiring/0/source/period", "missing"},
+      {withCore(
+           R"({"sync_inputs": 2, "wiring": [{"input": "sync", "source": {"kind": "square", "period": 1}}]})"),
+       core + "/wiring/0/source/period", "at least 2"},
+      {withCore(
+           R"({"sync_inputs": 2, "wiring": [{"input": "sync", "source": {"kind": "counter", "period": 1}}]})"),
+       core + "/wiring/0/source/period", "unknown key"},
+      {withCore(R"({"type": 3, "async_inputs": 1})"), core + "/type",
+       "only MOX cores (type 9) have ports"},
+      {withCore(R"({"type": 3, "status": "XYZ"})"), core + "/status", "hexadecimal digits"},
+      {withCore(R"({"status": "01"})"), core + "/status", "built from its widths"},
+      {withCore(R"({"name": 5})"), core + "/name", "expected a text"},
+  };
+  for (const Case& c : cases) {
+    SCOPED_TRACE(c.json);
+    try {
+      ZinSim::parseDescription(c.json);
+      ADD_FAILURE() << "accepted";
+    } catch (const DescriptionError& e) {
+      EXPECT_EQ(e.pointer(), c.pointer) << e.what();
+      EXPECT_NE(e.problem().find(c.problem), std::string::npos) << e.what();
+      const std::string shown = c.pointer.empty() ? "(description)" : c.pointer;
+      EXPECT_EQ(std::string(e.what()).rfind(shown + ": ", 0), 0u) << e.what();
+    }
+  }
+}
+
+TEST(Description, FilesAndDescriptionsBuiltInCode) {
+  const std::string path = ::testing::TempDir() + "/zinsim_description.json";
+  {
+    std::ofstream file(path);
+    file << withCore(R"({"async_outputs": 70000})");
+  }
+  try {
+    ZinSim::loadDescription(path);
+    ADD_FAILURE() << "accepted";
+  } catch (const DescriptionError& e) {
+    EXPECT_EQ(e.pointer(), "/devices/0/chains/0/cores/0/async_outputs");
+    EXPECT_NE(std::string(e.what()).find(path), std::string::npos) << e.what();
+  }
+  EXPECT_THROW(ZinSim::loadDescription(path + ".missing"), DescriptionError);
+
+  ZinSim::TargetDescription twice;
+  twice.cores = {ZinSimTest::moxCore({0, 1, 2}, 1, 1, 1, 1),
+                 ZinSimTest::moxCore({0, 1, 2}, 1, 1, 1, 1)};
+  try {
+    ZinSim::Target target(twice);
+    ADD_FAILURE() << "accepted";
+  } catch (const DescriptionError& e) {
+    EXPECT_EQ(e.pointer(), "/cores/1");
+    EXPECT_EQ(e.problem(), "device 00 chain 1 core 2 is described twice");
+  }
+  ZinSim::TargetDescription wide;
+  wide.cores = {ZinSimTest::moxCore({0, 0, 16}, 1, 1, 1, 1)};
+  EXPECT_THROW(ZinSim::Target{wide}, DescriptionError);
+}
+
+TEST(Description, DemoDesignHasEveryLayoutAndAnotherType) {
+  const ZinSim::TargetDescription demo = ZinSim::demoDescription();
+  ASSERT_EQ(demo.cores.size(), 4u);
+  EXPECT_EQ(nlohmann::json::parse(ZinSim::demoDescriptionJson())["devices"][0]["chains"][0]["cores"]
+                .size(),
+            4u);
+  ZinSim::Target target;
+  std::vector<ZIN_CORE_REF> refs;
+  target.listCores(refs);
+  ASSERT_EQ(refs.size(), 4u);
+  std::vector<uint32_t> keys;
+  for (const ZIN_CORE_REF& ref : refs) {
+    ZIN_CORE_INFO info{};
+    std::vector<unsigned char> status(16);
+    target.readStatus(ref, info, status.data(), 16, 128);
+    keys.push_back(info.coreType == 9 ? (info.coreMajorVersion << 4 | info.coreMinorVersion) : 0);
+  }
+  EXPECT_EQ(keys, (std::vector<uint32_t>{0xA2, 0x65, 0x51, 0}));
+  // The full-layout core counts on sync inputs 8 to 11 and loops its async outputs back.
+  const ZIN_CORE_REF full{0, 1, 0};
+  target.advance(5);
+  EXPECT_EQ(target.syncInputLevels(full).substr(8), "1010");  // 5, least significant bit first
+  EXPECT_EQ(target.asyncInputLevels(full), std::string(16, '0'));
+}
+
+}  // namespace
