@@ -45,8 +45,8 @@ ZINJTAG_API void ZinJtag_target_flush(uint32_t handle);
 /// Runs `work` with the session's transport while holding the session's transport mutex, so
 /// that no two transfers of one session overlap. Throws std::invalid_argument for an unknown
 /// handle; exceptions of `work` pass through.
-ZINJTAG_API void ZinJtag_session_withTransport(uint32_t handle,
-                                               const std::function<void(ZinRT::Zin_Transport&)>& work);
+ZINJTAG_API void ZinJtag_session_withTransport(
+    uint32_t handle, const std::function<void(ZinRT::Zin_Transport&)>& work);
 
 /// Registers a function that is called with the handle of every session being closed, before its
 /// transport is released. Used by the core list to drop the cores of a closed session. A hook

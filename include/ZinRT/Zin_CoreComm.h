@@ -9,8 +9,14 @@
 #include "ZinRT/ZinCore_Types.h"
 #include "ZinRT/Zin_ByteBuffer.h"
 
-typedef enum ZIN_PROGRESS_STATUS { ZIN_PROGRESS_RUNNING = 0, ZIN_PROGRESS_DONE = 1 } ZIN_PROGRESS_STATUS;
-typedef enum ZIN_PROGRESS_RETURN { ZIN_PROGRESS_CONTINUE = 0, ZIN_PROGRESS_CANCEL = 1 } ZIN_PROGRESS_RETURN;
+typedef enum ZIN_PROGRESS_STATUS {
+  ZIN_PROGRESS_RUNNING = 0,
+  ZIN_PROGRESS_DONE = 1
+} ZIN_PROGRESS_STATUS;
+typedef enum ZIN_PROGRESS_RETURN {
+  ZIN_PROGRESS_CONTINUE = 0,
+  ZIN_PROGRESS_CANCEL = 1
+} ZIN_PROGRESS_RETURN;
 /// Progress of a transfer: (lines done, lines in all, bits done, status).
 typedef ZIN_PROGRESS_RETURN (*ZIN_PROGRESS_CALLBACK)(uint32_t, uint32_t, uint32_t,
                                                      ZIN_PROGRESS_STATUS);
