@@ -2,8 +2,10 @@
 // target lock, and the two status calls ZinMOX_getInfo and ZinMOX_isMOXCore.
 #include <array>
 #include <cstring>
+#include <memory>
 #include <new>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "ZinRT/ZinJtag.h"
@@ -160,23 +162,72 @@ void expectInfo(const ZINMOX_CORE_INFO& info, const LayoutCase& c) {
 TEST_F(CallFrame, GetInfoDecodesEachLayoutFromTheVersionKey) {
   const std::vector<LayoutCase> cases = {
       // Key 0x61: eight-bit counts from bit 40; the qx fields are not in the word.
-      {"6.1", 6, 1, {{40, 8, 0xAB}, {48, 8, 0x01}, {56, 8, 0x80}, {64, 8, 0xFF}},
-       0, 0, 0, 0xAB, 0x01, 0x80, 0xFF},
+      {"6.1",
+       6,
+       1,
+       {{40, 8, 0xAB}, {48, 8, 0x01}, {56, 8, 0x80}, {64, 8, 0xFF}},
+       0,
+       0,
+       0,
+       0xAB,
+       0x01,
+       0x80,
+       0xFF},
       // 5.18: the key is (5 << 4) | 18 = 0x52, not the sum 0x62.
       {"5.18", 5, 18, {{40, 8, 3}, {48, 8, 4}, {56, 8, 5}, {64, 8, 6}}, 0, 0, 0, 3, 4, 5, 6},
       // Keys 0x62 and 0x9F: sixteen-bit counts from bit 40; a count of 0 is a count.
-      {"6.2", 6, 2, {{40, 16, 0x1234}, {56, 16, 0xFFFF}, {72, 16, 0}, {88, 16, 0x8001}},
-       0, 0, 0, 0x1234, 0xFFFF, 0, 0x8001},
-      {"9.15", 9, 15, {{40, 16, 0x0102}, {56, 16, 0x0304}, {72, 16, 0x0506}, {88, 16, 0x0708}},
-       0, 0, 0, 0x0102, 0x0304, 0x0506, 0x0708},
+      {"6.2",
+       6,
+       2,
+       {{40, 16, 0x1234}, {56, 16, 0xFFFF}, {72, 16, 0}, {88, 16, 0x8001}},
+       0,
+       0,
+       0,
+       0x1234,
+       0xFFFF,
+       0,
+       0x8001},
+      {"9.15",
+       9,
+       15,
+       {{40, 16, 0x0102}, {56, 16, 0x0304}, {72, 16, 0x0506}, {88, 16, 0x0708}},
+       0,
+       0,
+       0,
+       0x0102,
+       0x0304,
+       0x0506,
+       0x0708},
       // 9.16: (9 << 4) | 16 = 0x90 (the sum would be 0xA0).
-      {"9.16", 9, 16, {{40, 16, 11}, {56, 16, 22}, {72, 16, 33}, {88, 16, 44}},
-       0, 0, 0, 11, 22, 33, 44},
+      {"9.16",
+       9,
+       16,
+       {{40, 16, 11}, {56, 16, 22}, {72, 16, 33}, {88, 16, 44}},
+       0,
+       0,
+       0,
+       11,
+       22,
+       33,
+       44},
       // Key 0xA0: the qx version at 40/44/52, counts from bit 60.
-      {"10.0", 10, 0,
-       {{40, 4, 0xA}, {44, 8, 0x5C}, {52, 8, 0xE1}, {60, 16, 0xBEEF}, {76, 16, 1},
-        {92, 16, 0x7FFF}, {108, 16, 0x1000}},
-       0xA, 0x5C, 0xE1, 0xBEEF, 1, 0x7FFF, 0x1000},
+      {"10.0",
+       10,
+       0,
+       {{40, 4, 0xA},
+        {44, 8, 0x5C},
+        {52, 8, 0xE1},
+        {60, 16, 0xBEEF},
+        {76, 16, 1},
+        {92, 16, 0x7FFF},
+        {108, 16, 0x1000}},
+       0xA,
+       0x5C,
+       0xE1,
+       0xBEEF,
+       1,
+       0x7FFF,
+       0x1000},
   };
   uint32_t coreIndex = 0;
   for (const LayoutCase& c : cases) {
@@ -192,6 +243,33 @@ TEST_F(CallFrame, GetInfoDecodesEachLayoutFromTheVersionKey) {
   }
   expectNoMessages();
   EXPECT_FALSE(ZinJtag_session_isLocked(handle));
+}
+
+TEST_F(CallFrame, FailuresAreReportedOnTheCallersSessionInOrder) {
+  // A second session on its own target, with its own message record.
+  struct Record {
+    std::vector<std::pair<uint32_t, std::string>> messages;
+  } other;
+  auto otherTransport = std::make_shared<ScriptedTransport>();
+  const uint32_t otherHandle = ZinJtag_openSession(otherTransport);
+  ZinJtag_setMessageHandler(
+      otherHandle,
+      [](void* user, uint32_t, uint32_t code, const char* text) {
+        static_cast<Record*>(user)->messages.emplace_back(code, text);
+      },
+      &other);
+  ZINMOX_CORE_INFO info{};
+  EXPECT_EQ(ZinMOX_getInfo(otherHandle, &ref, &info), kFailure);
+  EXPECT_EQ(ZinMOX_defineSignal(otherHandle, &ref, "x", 0, 0), kFailure);
+  ZinJtag_closeSession(otherHandle);
+  expectNoMessages();
+  const std::vector<std::pair<uint32_t, std::string>> expected = {
+      {kErrorCode, "ZinMOX_getCoreInfo() for the wrong core type or non-existant core."},
+      {kAbortCode, "Zin abort command"},
+      {kErrorCode,
+       "Data structures not initialized for MOX core Device:1, user chain number:2, core index:0."},
+  };
+  EXPECT_EQ(other.messages, expected);
 }
 
 }  // namespace

@@ -201,7 +201,7 @@ TEST_F(CommandText, CoreWithoutInputsSendsNoRead) {
 TEST_F(CommandText, OutputImagePersistsAndUpdateMarksFollowEachWrite) {
   initMoxCore(ref, 0, 0, 6, 2);
   const uint8_t asyncData = 0x2D, asyncMask = 0x3F;  // 101101 from bit 0: "101101"
-  std::vector<uint8_t> steps(16, 0x02);               // sync bit 1 high on every step
+  std::vector<uint8_t> steps(16, 0x02);              // sync bit 1 high on every step
   const uint8_t syncMask = 0x02;
   ASSERT_EQ(ZinMOX_setPortBits(handle, &ref, &asyncData, &asyncMask, 6, steps.data(), &syncMask, 2),
             0u);

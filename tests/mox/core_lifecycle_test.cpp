@@ -28,9 +28,9 @@ class CoreLifecycle : public SessionFixture {
  protected:
   // Registers a plain framework core (not a MOX core object) of the given type at `ref`.
   void registerForeignCore(uint32_t coreType) {
-    Zin_CoreList::addCore(handle, new ZinRT::Zin_SignalCore(handle, ref,
-                                                            ZIN_CORE_INFO{0x10, coreType, 1, 0, 0},
-                                                            nullptr, 0));
+    Zin_CoreList::addCore(
+        handle,
+        new ZinRT::Zin_SignalCore(handle, ref, ZIN_CORE_INFO{0x10, coreType, 1, 0, 0}, nullptr, 0));
   }
 
   uint32_t sizeOf(const char* name, bool output) {
@@ -60,7 +60,9 @@ class CoreLifecycle : public SessionFixture {
         [&] { return ZinMOX_defineBus(handle, &ref, nullptr, 0, nullptr, 0); },
         [&] { return ZinMOX_undefineName(handle, &ref, nullptr, 0); },
         [&] { return ZinMOX_getSignalSizes(handle, &ref, nullptr, nullptr, 0, 0); },
-        [&] { return ZinMOX_setPortBits(handle, &ref, nullptr, nullptr, 999, nullptr, nullptr, 999); },
+        [&] {
+          return ZinMOX_setPortBits(handle, &ref, nullptr, nullptr, 999, nullptr, nullptr, 999);
+        },
         [&] {
           return ZinMOX_getPortBits(handle, &ref, nullptr, nullptr, nullptr, 999, nullptr, nullptr,
                                     nullptr, nullptr, nullptr, 999);

@@ -135,9 +135,9 @@ TEST_F(PortBits, PacksValuesMasksAndStepVectors) {
     steps.insert(steps.end(), bytes.begin(), bytes.end());
   }
   const std::vector<uint8_t> syncMask = packValue(0xFC00 | 0x201, 2);
-  ASSERT_EQ(set(asyncData.data(), asyncMask.data(), kAsyncOut, steps.data(), syncMask.data(),
-                kSyncOut),
-            0u);
+  ASSERT_EQ(
+      set(asyncData.data(), asyncMask.data(), kAsyncOut, steps.data(), syncMask.data(), kSyncOut),
+      0u);
   EXPECT_EQ(transport->flushCount(), 1u);
   WriteImage image = lastWrite();
   EXPECT_EQ(image.asyncValues, unpackBits(asyncData.data(), kAsyncOut));
@@ -209,6 +209,59 @@ TEST_F(PortBits, ReadFillsTheVectorsAskedFor) {
   for (const auto& v : none.async) EXPECT_TRUE(sentinel(v));
   for (const auto& v : none.sync) EXPECT_TRUE(sentinel(v));
   EXPECT_EQ(transport->flushCount(), 0u);
+  expectNoMessages();
+}
+
+}  // namespace
+
+namespace {
+
+class LargePorts : public ZinTest::SessionFixture {};
+
+TEST_F(LargePorts, WidestPortsRoundTripBitExactly) {
+  using namespace ZinTest;
+  constexpr uint32_t asyncIn = 65535, syncIn = 1001, asyncOut = 65535, syncOut = 4099;
+  initMoxCore(ref, asyncIn, syncIn, asyncOut, syncOut);
+  std::mt19937 rng(41);
+  std::uniform_int_distribution<int> byte(0, 255);
+  auto randomBytes = [&](std::size_t n) {
+    std::vector<uint8_t> v(n);
+    for (uint8_t& b : v) b = static_cast<uint8_t>(byte(rng));
+    return v;
+  };
+  const std::size_t syncBytes = (syncOut + 7) / 8;
+  const std::vector<uint8_t> asyncData = randomBytes((asyncOut + 7) / 8),
+                             asyncMask = randomBytes((asyncOut + 7) / 8),
+                             steps = randomBytes(16 * syncBytes), syncMask = randomBytes(syncBytes);
+  ASSERT_EQ(ZinMOX_setPortBits(handle, &ref, asyncData.data(), asyncMask.data(), asyncOut,
+                               steps.data(), syncMask.data(), syncOut),
+            0u);
+  auto sent = transport->transfers();
+  ASSERT_EQ(sent.size(), 1u);
+  WriteImage image = decodeWriteCommand(sent[0].text, linePrefix(ref), asyncOut, syncOut);
+  EXPECT_EQ(image.asyncValues, unpackBits(asyncData.data(), asyncOut));
+  EXPECT_EQ(image.asyncUpdate, unpackBits(asyncMask.data(), asyncOut));
+  EXPECT_EQ(image.syncUpdate, unpackBits(syncMask.data(), syncOut));
+  std::vector<std::string> stepStrings(16);
+  for (uint32_t t = 0; t < 16; ++t) stepStrings[t] = unpackBits(&steps[t * syncBytes], syncOut);
+  for (uint32_t i = 0; i < syncOut; i += 97) {
+    std::string expected;
+    for (uint32_t t = 0; t < 16; ++t) expected.push_back(stepStrings[t][i]);
+    EXPECT_EQ(image.steps[i], expected) << "synchronous output bit " << i;
+  }
+
+  InputImage input = InputImage::random(asyncIn, syncIn, rng);
+  transport->queueReadData(readDataFor(input));
+  std::vector<std::vector<uint8_t>> async(3, std::vector<uint8_t>((asyncIn + 7) / 8));
+  std::vector<std::vector<uint8_t>> sync(5, std::vector<uint8_t>((syncIn + 7) / 8));
+  ASSERT_EQ(ZinMOX_getPortBits(handle, &ref, async[0].data(), async[1].data(), async[2].data(),
+                               asyncIn, sync[0].data(), sync[1].data(), sync[2].data(),
+                               sync[3].data(), sync[4].data(), syncIn),
+            0u);
+  EXPECT_EQ(unpackBits(async[0].data(), asyncIn), input.asyncValue);
+  EXPECT_EQ(unpackBits(async[2].data(), asyncIn), input.asyncDown);
+  EXPECT_EQ(unpackBits(sync[1].data(), syncIn), input.syncUp);
+  EXPECT_EQ(unpackBits(sync[4].data(), syncIn), input.syncSyncDown);
   expectNoMessages();
 }
 

@@ -31,9 +31,9 @@ std::vector<uint32_t> range(uint32_t n) {
 class ReadValues : public SessionFixture {
  protected:
   void defineBus(const char* name, uint32_t type, std::vector<uint32_t> bits) {
-    ASSERT_EQ(ZinMOX_defineBus(handle, &ref, name, type, bits.data(),
-                               static_cast<uint32_t>(bits.size())),
-              0u);
+    ASSERT_EQ(
+        ZinMOX_defineBus(handle, &ref, name, type, bits.data(), static_cast<uint32_t>(bits.size())),
+        0u);
   }
   uint32_t read(ZinMOX_ValueMap& map) {
     uintptr_t word = mapWord(map);
@@ -142,7 +142,8 @@ class ReadArrays : public ReadValues {
   }
 
   // Expected sample block of a signal: the bits of one port string at the positions.
-  static std::vector<uint8_t> blockOf(const std::string& port, const std::vector<uint32_t>& positions) {
+  static std::vector<uint8_t> blockOf(const std::string& port,
+                                      const std::vector<uint32_t>& positions) {
     std::string bits;
     for (uint32_t p : positions) bits.push_back(port[p]);
     return packBits(bits);
@@ -160,7 +161,8 @@ TEST_F(ReadArrays, ThreeSamplesLandOneBlockApart) {
     transport->queueReadData(readDataFor(images.back()));
   }
   // x12: value, up, down (2 bytes per sample); y3: all five, but one sync-activity vector null.
-  std::vector<std::vector<uint8_t>> x(3, std::vector<uint8_t>(6, 0)), y(5, std::vector<uint8_t>(3, 0));
+  std::vector<std::vector<uint8_t>> x(3, std::vector<uint8_t>(6, 0)),
+      y(5, std::vector<uint8_t>(3, 0));
   x[0][1] = 0xF0;  // spare bits of sample 0 that are already set stay set
   uint8_t* values[2] = {x[0].data(), y[0].data()};
   uint8_t* up[2] = {x[1].data(), y[1].data()};
@@ -211,15 +213,16 @@ TEST_F(ReadArrays, ChecksSizesAndNamesBeforeReading) {
   uint32_t sizes[2] = {5, 6};
   auto failureOf = [&](std::vector<std::string> names, uint32_t count, uint32_t samples) {
     try {
-      core->readValues(handle, ref, names, values, nullptr, nullptr, nullptr, nullptr, sizes,
-                       count, samples);
+      core->readValues(handle, ref, names, values, nullptr, nullptr, nullptr, nullptr, sizes, count,
+                       samples);
     } catch (const std::logic_error& error) {
       return std::string(error.what());
     }
     ADD_FAILURE() << "no std::logic_error";
     return std::string();
   };
-  EXPECT_EQ(failureOf({"x12"}, 1, 3), "The size of the value is not large enough for the signal: x12");
+  EXPECT_EQ(failureOf({"x12"}, 1, 3),
+            "The size of the value is not large enough for the signal: x12");
   EXPECT_EQ(failureOf({"out", "x12"}, 2, 3), "Could not find a signal with the name: out");
   EXPECT_EQ(failureOf({"x12", "nope"}, 2, 0), "Could not find a signal with the name: nope")
       << "the checks run even for 0 samples";

@@ -84,8 +84,8 @@ TEST_F(SignalGroup, AsynchronousValuesGoToTheirPositions) {
   EXPECT_EQ(command.getAsyncOutUpdateBits(), "0001010100");
 
   // Nine bits need two bytes; value bit 8 is bit 0 of the second byte.
-  ZinMOX_SignalGroup nine = group(Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_OUTPUT,
-                                  {0, 1, 2, 3, 4, 5, 6, 7, 9}, "nine");
+  ZinMOX_SignalGroup nine =
+      group(Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_OUTPUT, {0, 1, 2, 3, 4, 5, 6, 7, 9}, "nine");
   const uint8_t value[2] = {0x00, 0x01};
   EXPECT_EQ(failureOf([&] { nine.setValues(value, 1, 1); }),
             "The size of the value is not large enough for the signal: nine");
@@ -155,8 +155,8 @@ TEST_F(SignalGroup, CollectsInputBitsWithoutClearingAny) {
   EXPECT_EQ(untouchedDown, 0xA5);
   async.getValues(nullptr, nullptr, &adown, nullptr, nullptr, 1);
 
-  ZinMOX_SignalGroup nine = group(Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_INPUT,
-                                  {0, 1, 2, 3, 4, 5, 6, 7, 8}, "nine");
+  ZinMOX_SignalGroup nine =
+      group(Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_INPUT, {0, 1, 2, 3, 4, 5, 6, 7, 8}, "nine");
   uint8_t small[2] = {0x11, 0x22};
   EXPECT_EQ(failureOf([&] { nine.getValues(small, nullptr, nullptr, nullptr, nullptr, 1); }),
             "The size of the value is not large enough for the signal: nine");

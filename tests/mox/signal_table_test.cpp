@@ -14,7 +14,8 @@ using namespace ZinTest;
 const char* const kDuplicateTail =
     ", is already used by another signal and will not be re-defined. Note: Signal names are "
     "case-insensitive";
-const char* const kUndefinedTail = ", has not been defined. Note: Signal names are case-insensitive";
+const char* const kUndefinedTail =
+    ", has not been defined. Note: Signal names are case-insensitive";
 const char* const kIndexMessage =
     "This signal cannot be defined because an index is greater than the number of this signal "
     "type.";
@@ -100,7 +101,8 @@ TEST_F(SignalTable, DefinitionChecksRunInTheirOrder) {
   EXPECT_EQ(define("x", ZINMOX_ASYNC_OUTPUT, 7), 0u);
   // An index is checked before the name is looked up.
   EXPECT_EQ(failureOf(define("x", ZINMOX_ASYNC_OUTPUT, 8)), kIndexMessage);
-  EXPECT_EQ(failureOf(define("x", ZINMOX_ASYNC_OUTPUT, 7)), std::string("The name, x") + kDuplicateTail);
+  EXPECT_EQ(failureOf(define("x", ZINMOX_ASYNC_OUTPUT, 7)),
+            std::string("The name, x") + kDuplicateTail);
   expectNoMessages();
 }
 
@@ -187,10 +189,10 @@ TEST_F(SignalTable, ReservedNamesExistOnlyForPortsOfNonZeroWidth) {
   for (const char* name : {"async_out_data", "sync_out_data"}) EXPECT_EQ(sizeOf(name, true), kNone);
   for (const char* name : {"async_in_data", "sync_in_data"}) EXPECT_EQ(sizeOf(name, false), kNone);
   using ZinRT::Zin_SignalBase;
-  for (uint32_t type : {Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_INPUT,
-                        Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT,
-                        Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_OUTPUT,
-                        Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_OUTPUT}) {
+  for (uint32_t type :
+       {Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_INPUT, Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT,
+        Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_OUTPUT,
+        Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_OUTPUT}) {
     EXPECT_EQ(empty->getCorePhysicalSignalCount(type), 0u);
   }
 }
@@ -200,8 +202,10 @@ TEST_F(SignalTable, NamesAreUniquePerDirection) {
   EXPECT_EQ(define("x", ZINMOX_ASYNC_INPUT, 3), 0u) << "one input and one output may share a name";
   EXPECT_EQ(sizeOf("x", true), 2u);
   EXPECT_EQ(sizeOf("x", false), 1u);
-  EXPECT_EQ(failureOf(define("x", ZINMOX_SYNC_OUTPUT, 0)), std::string("The name, x") + kDuplicateTail);
-  EXPECT_EQ(failureOf(define("x", ZINMOX_SYNC_INPUT, 0)), std::string("The name, x") + kDuplicateTail);
+  EXPECT_EQ(failureOf(define("x", ZINMOX_SYNC_OUTPUT, 0)),
+            std::string("The name, x") + kDuplicateTail);
+  EXPECT_EQ(failureOf(define("x", ZINMOX_SYNC_INPUT, 0)),
+            std::string("The name, x") + kDuplicateTail);
   // Undefining one direction leaves the other.
   EXPECT_EQ(undefine("x", ZINMOX_SYNC_INPUT), 0u);
   EXPECT_EQ(sizeOf("x", true), 2u);

@@ -29,9 +29,9 @@ class WriteArrays : public SessionFixture {
   }
 
   void defineBus(const char* name, uint32_t type, std::vector<uint32_t> bits) {
-    ASSERT_EQ(ZinMOX_defineBus(handle, &ref, name, type, bits.data(),
-                               static_cast<uint32_t>(bits.size())),
-              0u);
+    ASSERT_EQ(
+        ZinMOX_defineBus(handle, &ref, name, type, bits.data(), static_cast<uint32_t>(bits.size())),
+        0u);
   }
 
   // Calls the array overload with one value block per name.
@@ -69,7 +69,8 @@ class WriteArrays : public SessionFixture {
     return steps;
   }
 
-  static std::string marks(uint32_t width, std::initializer_list<const std::vector<uint32_t>*> sets) {
+  static std::string marks(uint32_t width,
+                           std::initializer_list<const std::vector<uint32_t>*> sets) {
     std::string result(width, '0');
     for (const auto* positions : sets) {
       for (uint32_t p : *positions) result[p] = '1';
@@ -78,7 +79,8 @@ class WriteArrays : public SessionFixture {
   }
 
   ZinRT::ZinMOX_Core* core = nullptr;
-  std::vector<uint32_t> s3{0, 1, 2}, s9{11, 10, 9, 8, 7, 6, 5, 4, 3}, a8{8, 9, 10, 11, 12, 13, 14, 15};
+  std::vector<uint32_t> s3{0, 1, 2}, s9{11, 10, 9, 8, 7, 6, 5, 4, 3},
+      a8{8, 9, 10, 11, 12, 13, 14, 15};
 };
 
 TEST_F(WriteArrays, BurstOfTwentyValuesGoesOutInTwoTransfers) {
@@ -96,7 +98,8 @@ TEST_F(WriteArrays, BurstOfTwentyValuesGoesOutInTwoTransfers) {
   ASSERT_EQ(images.size(), 2u);
   EXPECT_EQ(transport->flushCount(), 2u);
 
-  const std::vector<uint32_t> first3(v3.begin(), v3.begin() + 16), first9(v9.begin(), v9.begin() + 16);
+  const std::vector<uint32_t> first3(v3.begin(), v3.begin() + 16),
+      first9(v9.begin(), v9.begin() + 16);
   std::vector<uint32_t> second3(v3.begin() + 16, v3.end()), second9(v9.begin() + 16, v9.end());
   second3.resize(16, v3[19]);  // value 19 fills steps 4 to 15
   second9.resize(16, v9[19]);
@@ -104,8 +107,10 @@ TEST_F(WriteArrays, BurstOfTwentyValuesGoesOutInTwoTransfers) {
       {first3, first9}, {second3, second9}};
   for (std::size_t n = 0; n < 2; ++n) {
     SCOPED_TRACE(testing::Message() << "transfer " << n);
-    for (uint32_t i = 0; i < 3; ++i) EXPECT_EQ(images[n].steps[s3[i]], stepsOf(expected[n].first, i));
-    for (uint32_t i = 0; i < 9; ++i) EXPECT_EQ(images[n].steps[s9[i]], stepsOf(expected[n].second, i));
+    for (uint32_t i = 0; i < 3; ++i)
+      EXPECT_EQ(images[n].steps[s3[i]], stepsOf(expected[n].first, i));
+    for (uint32_t i = 0; i < 9; ++i)
+      EXPECT_EQ(images[n].steps[s9[i]], stepsOf(expected[n].second, i));
     EXPECT_EQ(images[n].syncUpdate, marks(kSyncOut, {&s3, &s9}));
     EXPECT_EQ(images[n].asyncUpdate, std::string(kAsyncOut, '0'));
   }
@@ -134,7 +139,8 @@ TEST_F(WriteArrays, ChecksEveryEntryInOrderBeforeSendingAnything) {
   const uint8_t block[64] = {};
   const uint8_t* v = block;
   // Within one entry: lookup, burst mode, size, null pointer.
-  EXPECT_EQ(failureOf({"nope"}, {nullptr}, {0}, 2, 1), "Could not find a signal with the name: nope");
+  EXPECT_EQ(failureOf({"nope"}, {nullptr}, {0}, 2, 1),
+            "Could not find a signal with the name: nope");
   EXPECT_EQ(failureOf({"in"}, {v}, {64}, 1, 0), "Could not find a signal with the name: in");
   EXPECT_EQ(failureOf({"a8"}, {nullptr}, {0}, 2, 1),
             "Burst mode cannot be used with the non-synchronous output: a8");

@@ -32,9 +32,9 @@ class WriteValues : public SessionFixture {
   }
 
   void defineBus(const char* name, uint32_t type, std::vector<uint32_t> bits) {
-    ASSERT_EQ(ZinMOX_defineBus(handle, &ref, name, type, bits.data(),
-                               static_cast<uint32_t>(bits.size())),
-              0u);
+    ASSERT_EQ(
+        ZinMOX_defineBus(handle, &ref, name, type, bits.data(), static_cast<uint32_t>(bits.size())),
+        0u);
   }
 
   uint32_t write(ZinMOX_ValueMap map) {
@@ -89,14 +89,14 @@ TEST_F(WriteValues, FitsTextsToTheSignalWidth) {
     uint64_t value;
   };
   const std::vector<Case> fitted = {
-      {"w16", "8", 0xFFF8},      // sign extension from a digit with bit 3 set
-      {"w16", "7", 0x0007},      //
-      {"w16", "08", 0x0008},     // a leading 0 keeps the value positive
-      {"w16", "abCd", 0xABCD},   // either letter case
-      {"w8", "12345", 0x45},     // the last two digits are kept
-      {"w8", "0x12", 0x12},      // the prefix is among the dropped characters
-      {"w8", "zz05", 0x05},      // dropped characters are not examined
-      {"w8", "F", 0xFF},         //
+      {"w16", "8", 0xFFF8},     // sign extension from a digit with bit 3 set
+      {"w16", "7", 0x0007},     //
+      {"w16", "08", 0x0008},    // a leading 0 keeps the value positive
+      {"w16", "abCd", 0xABCD},  // either letter case
+      {"w8", "12345", 0x45},    // the last two digits are kept
+      {"w8", "0x12", 0x12},     // the prefix is among the dropped characters
+      {"w8", "zz05", 0x05},     // dropped characters are not examined
+      {"w8", "F", 0xFF},        //
   };
   for (const Case& c : fitted) {
     SCOPED_TRACE(std::string(c.signal) + " = " + c.text);
@@ -132,8 +132,8 @@ TEST_F(WriteValues, PulseTrainsPutStepZeroInTheLeastSignificantBlock) {
     if (t >= 16) {
       std::snprintf(block, sizeof block, "%04X", 0xABCDu);
     } else {
-      std::snprintf(block, sizeof block, "%04X", (static_cast<unsigned>(t) << 12) |
-                                                     ((t * 0x123u + 0x5Au) & 0xFFFu));
+      std::snprintf(block, sizeof block, "%04X",
+                    (static_cast<unsigned>(t) << 12) | ((t * 0x123u + 0x5Au) & 0xFFFu));
     }
     text += block;
   }
@@ -177,7 +177,8 @@ TEST_F(WriteValues, ChecksEveryKeyBeforeExaminingAnyValue) {
   // other entry's text is bad.
   writeFails({{"w8.pulsetrain", "1"}, {"p3", "zz"}},
              ".pulsetrain cannot be used with the non-synchronous output: w8");
-  writeFails({{"w16", "zz"}, {"nope.pulsetrain", "1"}}, "Could not find a signal with the name: nope");
+  writeFails({{"w16", "zz"}, {"nope.pulsetrain", "1"}},
+             "Could not find a signal with the name: nope");
   writeFails({{"a.b", "1"}}, "Could not find a signal with the name: a");
 }
 

@@ -67,7 +67,9 @@ class SessionFixture : public ::testing::Test {
 };
 
 /// The word that the value-map arguments point to: the map's address.
-inline uintptr_t mapWord(ZinRT::ZinMOX_ValueMap& map) { return reinterpret_cast<uintptr_t>(&map); }
+inline uintptr_t mapWord(ZinRT::ZinMOX_ValueMap& map) {
+  return reinterpret_cast<uintptr_t>(&map);
+}
 
 }  // namespace ZinTest
 

@@ -41,7 +41,8 @@ CommandLine parseLine(const std::string& line) {
   std::size_t start = 0;
   for (;;) {
     std::size_t end = line.find(' ', start);
-    fields.push_back(line.substr(start, end == std::string::npos ? std::string::npos : end - start));
+    fields.push_back(
+        line.substr(start, end == std::string::npos ? std::string::npos : end - start));
     if (end == std::string::npos) break;
     start = end + 1;
   }
@@ -98,7 +99,9 @@ std::string writeBits(const WriteImage& image) {
   return bits + image.asyncUpdate + image.syncUpdate;
 }
 
-std::string writeDataHex(const WriteImage& image) { return bitsToHex(writeBits(image)); }
+std::string writeDataHex(const WriteImage& image) {
+  return bitsToHex(writeBits(image));
+}
 
 WriteImage decodeWriteData(const std::string& dataHex, uint32_t asyncOut, uint32_t syncOut) {
   std::string bits = hexToBits(dataHex, 2u * asyncOut + 17u * syncOut);
@@ -113,8 +116,8 @@ WriteImage decodeWriteData(const std::string& dataHex, uint32_t asyncOut, uint32
   return image;
 }
 
-WriteImage decodeWriteCommand(const std::string& text, const std::string& prefix,
-                              uint32_t asyncOut, uint32_t syncOut) {
+WriteImage decodeWriteCommand(const std::string& text, const std::string& prefix, uint32_t asyncOut,
+                              uint32_t syncOut) {
   std::vector<std::string> lines = splitLines(text);
   if (lines.size() != 2) {
     ADD_FAILURE() << "a write sequence has two lines: \"" << text << "\"";
@@ -142,8 +145,8 @@ InputImage InputImage::zeros(uint32_t asyncIn, uint32_t syncIn) {
   for (std::string* s : {&image.asyncValue, &image.asyncUp, &image.asyncDown}) {
     s->assign(asyncIn, '0');
   }
-  for (std::string* s : {&image.syncValue, &image.syncUp, &image.syncDown, &image.syncSyncUp,
-                         &image.syncSyncDown}) {
+  for (std::string* s :
+       {&image.syncValue, &image.syncUp, &image.syncDown, &image.syncSyncUp, &image.syncSyncDown}) {
     s->assign(syncIn, '0');
   }
   return image;
@@ -165,14 +168,13 @@ std::string inputBits(const InputImage& image, char unused) {
     bits += {image.asyncValue[i], image.asyncUp[i], image.asyncDown[i], unused};
   }
   for (uint32_t i = 0; i < image.syncCount(); ++i) {
-    bits += {image.syncValue[i], image.syncUp[i],      image.syncDown[i],
+    bits += {image.syncValue[i],  image.syncUp[i],       image.syncDown[i],
              image.syncSyncUp[i], image.syncSyncDown[i], unused};
   }
   return bits;
 }
 
-std::vector<unsigned char> readDataFor(const std::string& bits, uint32_t readBits,
-                                       bool junkAbove) {
+std::vector<unsigned char> readDataFor(const std::string& bits, uint32_t readBits, bool junkAbove) {
   std::vector<unsigned char> bytes((readBits + 7) / 8, 0);
   const std::size_t n = bits.size();
   for (std::size_t k = 0; k < n; ++k) {

@@ -54,8 +54,8 @@ WriteImage decodeWriteData(const std::string& dataHex, uint32_t asyncOut, uint32
 /// Checks that `text` is a complete write sequence (a code 01 line with the right bit length and
 /// read flag, then the code 02 line) for the core at `prefix` ("DD C K ") and decodes its image.
 /// Structural mismatches are reported as test failures.
-WriteImage decodeWriteCommand(const std::string& text, const std::string& prefix,
-                              uint32_t asyncOut, uint32_t syncOut);
+WriteImage decodeWriteCommand(const std::string& text, const std::string& prefix, uint32_t asyncOut,
+                              uint32_t syncOut);
 
 /// The exact read sequence (codes 03 and 04) for a core with the given input widths.
 std::string readCommandText(const std::string& prefix, uint32_t asyncIn, uint32_t syncIn);
@@ -64,7 +64,7 @@ uint32_t readBitCount(uint32_t asyncIn, uint32_t syncIn);
 
 /// The input image that a read delivers: character i of each string is port bit i.
 struct InputImage {
-  std::string asyncValue, asyncUp, asyncDown;                      // A_in characters each
+  std::string asyncValue, asyncUp, asyncDown;                         // A_in characters each
   std::string syncValue, syncUp, syncDown, syncSyncUp, syncSyncDown;  // S_in characters each
 
   static InputImage zeros(uint32_t asyncIn, uint32_t syncIn);
