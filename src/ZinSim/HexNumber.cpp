@@ -32,14 +32,13 @@ std::string parseHexNumber(std::string_view text, uint64_t bitCount, std::vector
     const int d = digitValue(text[pos]);
     if (d < 0) return "data is not hexadecimal (character " + std::to_string(pos + 1) + ")";
     const uint64_t lowBit = 4 * static_cast<uint64_t>(text.size() - 1 - pos);
-    for (uint64_t b = 0; b < 4; ++b) {
-      if (((d >> b) & 1) == 0) continue;
-      const uint64_t bit = lowBit + b;
-      if (bit >= bitCount) {
-        return "data does not fit in " + std::to_string(bitCount) + " bits";
-      }
-      if (number != nullptr)
-        (*number)[bit / 8] = static_cast<uint8_t>((*number)[bit / 8] | (1u << (bit % 8)));
+    if (d == 0) continue;
+    if (lowBit >= bitCount || (bitCount - lowBit < 4 && (d >> (bitCount - lowBit)) != 0)) {
+      return "data does not fit in " + std::to_string(bitCount) + " bits";
+    }
+    if (number != nullptr) {  // a digit starts at bit 0 or 4 of a byte
+      uint8_t& byte = (*number)[lowBit / 8];
+      byte = static_cast<uint8_t>(byte | (d << (lowBit % 8)));
     }
   }
   return {};
