@@ -97,6 +97,10 @@ ZINSIM_API TargetDescription parseDescription(std::string_view jsonText);
 /// read).
 ZINSIM_API TargetDescription loadDescription(const std::string& path);
 
+/// The JSON text of a description, in the format parseDescription reads (cores grouped by device
+/// and user chain, in reference order). `indent` < 0 gives a single line.
+ZINSIM_API std::string descriptionToJson(const TargetDescription& description, int indent = 2);
+
 /// The built-in demo design, as a description and as its JSON text.
 ZINSIM_API TargetDescription demoDescription();
 ZINSIM_API const std::string& demoDescriptionJson();
