@@ -1,0 +1,31 @@
+/* libZinNet: the host call that opens a JTAG session on a target server. Usable from C and C++.
+
+   The session's transport is a TCP connection to a server started with `zinmox serve` (or
+   ZinNet::Server). Close the session with ZinJtag_closeSession as any other. */
+#ifndef ZINNET_ZINNET_H
+#define ZINNET_ZINNET_H
+
+#include <stdint.h>
+
+#include "ZinNet/ZinNet_Export.h"
+
+#ifdef __cplusplus
+extern "C" {
+#endif
+
+/* Connects to the target server at host:port and opens a JTAG session on it. `timeoutMs` bounds
+   the connection (resolution, connect and greeting) and every later request of the session;
+   0 takes the defaults (3000 ms to connect, 10000 ms per request). Returns the session handle,
+   or 0 when no session could be opened; ZinNet_lastError then tells why. A connection lost
+   later fails the call in progress, and the session's next call connects again. */
+ZINNET_API uint32_t ZinNet_openSession(const char* host, uint16_t port, uint32_t timeoutMs);
+
+/* The text of the calling thread's last ZinNet_openSession failure ("" after a success). The
+   text stays valid until the thread's next ZinNet_openSession call. */
+ZINNET_API const char* ZinNet_lastError(void);
+
+#ifdef __cplusplus
+}
+#endif
+
+#endif

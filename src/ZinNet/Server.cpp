@@ -1,0 +1,199 @@
+// The server: listener, accept loop, I/O thread, request thread, signals and shutdown.
+#include "ZinNet/Server.h"
+
+#include <condition_variable>
+#include <csignal>
+#include <optional>
+#include <stdexcept>
+#include <thread>
+
+#include "Asio.h"
+#include "ServerConnection.h"
+#include "ServerCore.h"
+
+namespace ZinNet {
+
+using asio::ip::tcp;
+
+struct Server::Impl {
+  Impl(std::shared_ptr<ZinRT::Zin_Transport> transport, ServerOptions options)
+      : core(std::make_shared<ServerCore>(std::move(transport), std::move(options))) {}
+
+  void listen();
+  void accept();
+  void onAccepted(std::error_code ec, tcp::socket socket);
+  void watchSignals();
+  void ioMain();
+
+  std::shared_ptr<ServerCore> core;
+  // Declared after the core: the I/O objects go first, and with them every connection.
+  asio::io_context io;
+  asio::thread_pool requests{1};  // carries out the requests, one at a time, in arrival order
+  std::optional<tcp::acceptor> acceptor;
+  std::optional<asio::signal_set> signals;
+  std::optional<asio::steady_timer> retry;
+  std::thread ioThread;
+  tcp::endpoint bound;
+  uint64_t nextId = 1;
+  std::vector<std::weak_ptr<ServerConnection>> connections;  // I/O thread, then stop()
+
+  mutable std::mutex stateMutex;
+  std::condition_variable stoppedChanged;
+  bool started = false;
+  bool ioDone = false;
+  bool joined = false;
+};
+
+void Server::Impl::listen() {
+  const ServerOptions& options = core->options;
+  std::error_code ec;
+  tcp::resolver resolver(io);
+  const auto results =
+      resolver.resolve(options.host, std::to_string(options.port), tcp::resolver::passive, ec);
+  const std::string where = options.host + ":" + std::to_string(options.port);
+  if (ec || results.empty()) {
+    throw std::runtime_error("ZinNet: cannot listen on " + where + ": " +
+                             (ec ? ec.message() : "no such address"));
+  }
+  acceptor.emplace(io);
+  const tcp::endpoint endpoint = results.begin()->endpoint();
+  acceptor->open(endpoint.protocol(), ec);
+  if (!ec) acceptor->set_option(tcp::acceptor::reuse_address(true), ec);
+  if (!ec) acceptor->bind(endpoint, ec);
+  if (!ec) acceptor->listen(asio::socket_base::max_listen_connections, ec);
+  if (!ec) bound = acceptor->local_endpoint(ec);
+  if (ec) throw std::runtime_error("ZinNet: cannot listen on " + where + ": " + ec.message());
+  const bool loopback = bound.address().is_loopback();
+  core->log("listening on " + bound.address().to_string() + ":" + std::to_string(bound.port()) +
+            (loopback ? " (loopback only: other machines cannot connect)"
+                      : " (open to other machines: whoever reaches this port drives the target)"));
+}
+
+void Server::Impl::accept() {
+  acceptor->async_accept(asio::make_strand(io), [this](std::error_code ec, tcp::socket socket) {
+    onAccepted(ec, std::move(socket));
+  });
+}
+
+void Server::Impl::onAccepted(std::error_code ec, tcp::socket socket) {
+  if (ec == asio::error::operation_aborted || !acceptor->is_open()) return;
+  if (ec) {
+    // Out of descriptors or a similar passing fault: try again a little later.
+    core->log("accept failed: " + ec.message());
+    retry.emplace(io, std::chrono::milliseconds(100));
+    retry->async_wait([this](std::error_code e) {
+      if (!e) accept();
+    });
+    return;
+  }
+  ++core->connectionsAccepted;
+  auto connection = std::make_shared<ServerConnection>(core, std::move(socket),
+                                                       requests.get_executor(), nextId++);
+  std::erase_if(connections, [](const auto& weak) { return weak.expired(); });
+  connections.push_back(connection);
+  if (core->connectionsOpen > core->options.maxClients) {
+    connection->refuseAndClose("the server is busy: " + std::to_string(core->options.maxClients) +
+                               " clients are connected");
+  } else {
+    connection->start();
+  }
+  accept();
+}
+
+void Server::Impl::watchSignals() {
+  signals.emplace(io, SIGINT, SIGTERM);
+  signals->async_wait([this](std::error_code ec, int number) {
+    if (ec) return;
+    core->log(std::string("stopping on ") + (number == SIGINT ? "SIGINT" : "SIGTERM"));
+    core->stopping = true;
+    io.stop();
+  });
+}
+
+void Server::Impl::ioMain() {
+  try {
+    io.run();
+  } catch (const std::exception& e) {
+    core->log(std::string("stopped by an error: ") + e.what());
+  }
+  core->stopping = true;
+  std::lock_guard<std::mutex> lock(stateMutex);
+  ioDone = true;
+  stoppedChanged.notify_all();
+}
+
+Server::Server(std::shared_ptr<ZinRT::Zin_Transport> transport, ServerOptions options) {
+  if (!transport) throw std::invalid_argument("ZinNet::Server: null transport");
+  impl_ = std::make_unique<Impl>(std::move(transport), std::move(options));
+}
+
+Server::~Server() {
+  stop();
+}
+
+void Server::start() {
+  {
+    std::lock_guard<std::mutex> lock(impl_->stateMutex);
+    if (impl_->started) throw std::logic_error("ZinNet::Server: started twice");
+    impl_->started = true;
+  }
+  try {
+    impl_->listen();
+  } catch (...) {
+    std::lock_guard<std::mutex> lock(impl_->stateMutex);
+    impl_->started = false;
+    throw;
+  }
+  if (impl_->core->options.stopOnSignals) impl_->watchSignals();
+  impl_->accept();
+  impl_->ioThread = std::thread([impl = impl_.get()] { impl->ioMain(); });
+}
+
+void Server::stop() {
+  {
+    std::lock_guard<std::mutex> lock(impl_->stateMutex);
+    if (!impl_->started || impl_->joined) return;
+    impl_->joined = true;
+  }
+  impl_->core->stopping = true;
+  impl_->io.stop();
+  if (impl_->ioThread.joinable()) impl_->ioThread.join();
+  impl_->requests.join();  // a request in progress finishes; the queued ones are skipped
+  // The I/O thread is gone: close what it left open, so clients see the end at once.
+  std::error_code ec;
+  if (impl_->acceptor) impl_->acceptor->close(ec);
+  for (const auto& weak : impl_->connections) {
+    if (auto connection = weak.lock()) connection->close("the server stopped");
+  }
+  impl_->connections.clear();
+  impl_->core->log("stopped");
+}
+
+void Server::wait() {
+  std::unique_lock<std::mutex> lock(impl_->stateMutex);
+  impl_->stoppedChanged.wait(lock, [&] { return !impl_->started || impl_->ioDone; });
+}
+
+bool Server::isRunning() const {
+  std::lock_guard<std::mutex> lock(impl_->stateMutex);
+  return impl_->started && !impl_->ioDone;
+}
+
+uint16_t Server::port() const {
+  return impl_->bound.port();
+}
+
+std::string Server::address() const {
+  return impl_->bound.address().to_string() + ":" + std::to_string(impl_->bound.port());
+}
+
+ServerStats Server::stats() const {
+  return impl_->core->snapshot();
+}
+
+void Server::withTransport(const std::function<void(ZinRT::Zin_Transport&)>& work) {
+  std::lock_guard<std::mutex> lock(impl_->core->requestMutex);
+  work(*impl_->core->transport);
+}
+
+}  // namespace ZinNet

@@ -1,0 +1,243 @@
+// Frame reading, greeting, request hand-off and reply writing of one client connection.
+#include "ServerConnection.h"
+
+#include <cstring>
+
+#include "RequestHandler.h"
+
+namespace ZinNet {
+
+using Protocol::MessageType;
+
+ServerConnection::ServerConnection(std::shared_ptr<ServerCore> core, asio::ip::tcp::socket socket,
+                                   asio::any_io_executor requests, uint64_t id)
+    : core_(std::move(core)),
+      socket_(std::move(socket)),
+      timer_(socket_.get_executor()),
+      requests_(std::move(requests)),
+      id_(id) {
+  std::error_code ec;
+  const auto remote = socket_.remote_endpoint(ec);
+  peer_ = ec ? std::string("an unknown peer")
+             : remote.address().to_string() + ":" + std::to_string(remote.port());
+  socket_.set_option(asio::ip::tcp::no_delay(true), ec);
+  ++core_->connectionsOpen;
+}
+
+ServerConnection::~ServerConnection() {
+  --core_->connectionsOpen;
+}
+
+void ServerConnection::start() {
+  core_->log("connection " + std::to_string(id_) + " from " + peer_ + " opened");
+  readPrefix();
+}
+
+void ServerConnection::close(const std::string& why) {
+  if (closed_) return;
+  closed_ = true;
+  std::error_code ec;
+  timer_.cancel();
+  socket_.shutdown(asio::ip::tcp::socket::shutdown_both, ec);
+  socket_.close(ec);
+  core_->log("connection " + std::to_string(id_) + " closed after " +
+             std::to_string(requestCount_) + " requests: " + why);
+}
+
+void ServerConnection::refuseAndClose(const std::string& why) {
+  core_->log("connection from " + peer_ + " refused: " + why);
+  send(textFrame(MessageType::Closing, why), true);
+}
+
+void ServerConnection::refuse(const std::string& why, bool thenClose) {
+  ++core_->framesRefused;
+  core_->log("connection " + std::to_string(id_) + ": " + why);
+  send(textFrame(thenClose ? MessageType::Closing : MessageType::Refused, why), thenClose);
+}
+
+void ServerConnection::armTimer(uint32_t ms, const char* what) {
+  const uint64_t generation = ++timerGeneration_;
+  timer_.cancel();
+  if (ms == 0) return;
+  timer_.expires_after(std::chrono::milliseconds(ms));
+  timer_.async_wait([self = shared_from_this(), generation, ms, what](std::error_code ec) {
+    if (ec || generation != self->timerGeneration_ || self->closed_) return;
+    ++self->core_->framesRefused;
+    self->close(std::string(what) + " not done within " + std::to_string(ms) + " ms");
+  });
+}
+
+void ServerConnection::disarmTimer() {
+  ++timerGeneration_;
+  timer_.cancel();
+}
+
+void ServerConnection::onReadError(std::error_code ec, const char* where) {
+  if (closed_) return;
+  if (ec == asio::error::eof && std::strcmp(where, "between frames") == 0) {
+    close("the client closed the connection");
+    return;
+  }
+  if (ec != asio::error::eof && ec != asio::error::connection_reset) {
+    close(std::string("read failed ") + where + ": " + ec.message());
+    return;
+  }
+  ++core_->framesRefused;
+  close(std::string("the client closed the connection ") + where);
+}
+
+void ServerConnection::readPrefix() {
+  if (closed_) return;
+  if (prefixBytes_ == 0) armTimer(core_->options.idleTimeoutMs, "waiting for a frame");
+  socket_.async_read_some(
+      asio::buffer(prefix_.data() + prefixBytes_, prefix_.size() - prefixBytes_),
+      [self = shared_from_this()](std::error_code ec, size_t n) { self->onPrefix(ec, n); });
+}
+
+void ServerConnection::onPrefix(std::error_code ec, size_t n) {
+  if (ec) {
+    onReadError(ec, prefixBytes_ == 0 ? "between frames" : "inside a frame's length");
+    return;
+  }
+  if (prefixBytes_ == 0 && n != 0) armTimer(core_->options.frameTimeoutMs, "a frame");
+  prefixBytes_ += n;
+  if (prefixBytes_ < prefix_.size()) {
+    readPrefix();
+    return;
+  }
+  prefixBytes_ = 0;
+  const uint32_t length = decodeLength(prefix_.data());
+  if (length == 0) {
+    refuse("frame of length 0", true);
+  } else if (length > core_->options.maxFrameBytes) {
+    refuse("frame of " + std::to_string(length) + " bytes exceeds the limit of " +
+               std::to_string(core_->options.maxFrameBytes) + " bytes",
+           true);
+  } else {
+    readBody(length);
+  }
+}
+
+void ServerConnection::readBody(uint32_t length) {
+  body_.assign(length, 0);
+  asio::async_read(socket_, asio::buffer(body_),
+                   [self = shared_from_this()](std::error_code ec, size_t) {
+                     if (ec) {
+                       self->onReadError(ec, "inside a frame");
+                       return;
+                     }
+                     Frame frame;
+                     frame.type = static_cast<MessageType>(self->body_.front());
+                     frame.body.assign(self->body_.begin() + 1, self->body_.end());
+                     self->body_.clear();
+                     self->onFrame(std::move(frame));
+                   });
+}
+
+void ServerConnection::onFrame(Frame frame) {
+  if (closed_) return;
+  disarmTimer();
+  if (!greeted_) {
+    onHello(frame);
+  } else if (frame.type == MessageType::Hello) {
+    refuse("hello sent twice", false);
+  } else if (!isRequest(frame.type)) {
+    refuse("unknown request type " + typeText(static_cast<uint8_t>(frame.type)), false);
+  } else {
+    runRequest(std::move(frame));
+  }
+}
+
+void ServerConnection::onHello(const Frame& frame) {
+  if (frame.type != MessageType::Hello) {
+    refuse("expected a hello frame first, got " + typeText(static_cast<uint8_t>(frame.type)), true);
+    return;
+  }
+  FrameReader in(frame, "hello");
+  if (in.remaining() != 6 || std::memcmp(in.bytes(4), Protocol::kMagic, 4) != 0) {
+    refuse("not a ZinNet hello", true);
+    return;
+  }
+  const uint16_t version = in.u16();
+  if (version != Protocol::kVersion) {
+    refuse("protocol version " + std::to_string(version) +
+               " is not supported; this server speaks " + std::to_string(Protocol::kVersion),
+           true);
+    return;
+  }
+  greeted_ = true;
+  FrameWriter out(MessageType::Welcome);
+  out.bytes(Protocol::kMagic, 4).u16(Protocol::kVersion);
+  out.u32(core_->options.maxFrameBytes).u32(core_->options.maxReadBytes);
+  send(out.text(boundedText(core_->options.name)).finish(), false);
+}
+
+void ServerConnection::runRequest(Frame frame) {
+  // The request runs on the request executor; the reply comes back to the I/O thread.
+  const MessageType type = frame.type;
+  asio::post(requests_, [self = shared_from_this(), type, frame = std::move(frame)]() {
+    if (self->core_->stopping) return;
+    Reply reply;
+    {
+      std::lock_guard<std::mutex> lock(self->core_->requestMutex);
+      reply = carryOut(frame, *self->core_->transport, self->core_->options.maxReadBytes);
+    }
+    asio::post(self->socket_.get_executor(), [self, type, reply = std::move(reply)]() mutable {
+      if (reply.carriedOut) {
+        ++self->core_->requestsServed;
+        ++self->requestCount_;
+      }
+      if (reply.refused) {
+        ++self->core_->framesRefused;
+        self->core_->log("connection " + std::to_string(self->id_) + ": refused a malformed " +
+                         typeText(static_cast<uint8_t>(type)) + " request");
+      }
+      self->send(std::move(reply.bytes), false);
+    });
+  });
+}
+
+void ServerConnection::lingerAndClose() {
+  // Stop sending, then drop what the client still sends until it closes too (bounded by a
+  // timer), so that the closing frame is not lost to a reset caused by unread bytes.
+  std::error_code ec;
+  socket_.shutdown(asio::ip::tcp::socket::shutdown_send, ec);
+  const uint64_t generation = ++timerGeneration_;
+  timer_.expires_after(std::chrono::milliseconds(kLingerMs));
+  timer_.async_wait([self = shared_from_this(), generation](std::error_code e) {
+    if (!e && generation == self->timerGeneration_) self->close("closed by the server");
+  });
+  drain();
+}
+
+void ServerConnection::drain() {
+  socket_.async_read_some(asio::buffer(scratch_),
+                          [self = shared_from_this()](std::error_code ec, size_t) {
+                            if (self->closed_) return;
+                            if (ec) {
+                              self->close("closed by the server");
+                            } else {
+                              self->drain();
+                            }
+                          });
+}
+
+void ServerConnection::send(std::vector<unsigned char> bytes, bool thenClose) {
+  if (closed_) return;
+  outgoing_ = std::move(bytes);
+  armTimer(core_->options.writeTimeoutMs, "sending a reply");
+  asio::async_write(socket_, asio::buffer(outgoing_),
+                    [self = shared_from_this(), thenClose](std::error_code ec, size_t) {
+                      if (self->closed_) return;
+                      self->disarmTimer();
+                      if (ec) {
+                        self->close("write failed: " + ec.message());
+                      } else if (thenClose) {
+                        self->lingerAndClose();
+                      } else {
+                        self->readPrefix();
+                      }
+                    });
+}
+
+}  // namespace ZinNet

@@ -1,0 +1,68 @@
+// One client connection of the server: reads frames, has requests carried out, writes replies.
+#ifndef ZINNET_SRC_SERVERCONNECTION_H
+#define ZINNET_SRC_SERVERCONNECTION_H
+
+#include <array>
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "Asio.h"
+#include "Frame.h"
+#include "ServerCore.h"
+
+namespace ZinNet {
+
+/// Lives on the server's I/O thread; the requests themselves run on the request executor, one at
+/// a time under the core's request mutex. A connection reads its next frame only after the reply
+/// to the previous one is written, so a client cannot queue up work on the server.
+class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
+ public:
+  ServerConnection(std::shared_ptr<ServerCore> core, asio::ip::tcp::socket socket,
+                   asio::any_io_executor requests, uint64_t id);
+  ~ServerConnection();
+
+  /// Starts reading frames.
+  void start();
+  /// Sends a closing frame with `why`, then closes (used for a server that is full).
+  void refuseAndClose(const std::string& why);
+  /// Closes the socket now.
+  void close(const std::string& why);
+
+ private:
+  void readPrefix();
+  void onPrefix(std::error_code ec, size_t n);
+  void readBody(uint32_t length);
+  void onFrame(Frame frame);
+  void onHello(const Frame& frame);
+  void runRequest(Frame frame);
+  void send(std::vector<unsigned char> bytes, bool thenClose);
+  void lingerAndClose();
+  void drain();
+  void refuse(const std::string& why, bool thenClose);
+  void armTimer(uint32_t ms, const char* what);
+  void disarmTimer();
+  void onReadError(std::error_code ec, const char* where);
+
+  std::shared_ptr<ServerCore> core_;
+  asio::ip::tcp::socket socket_;
+  asio::steady_timer timer_;
+  asio::any_io_executor requests_;
+  uint64_t id_;
+  std::string peer_;
+  uint64_t timerGeneration_ = 0;
+  std::array<unsigned char, Protocol::kLengthBytes> prefix_{};
+  size_t prefixBytes_ = 0;
+  std::vector<unsigned char> body_;
+  std::vector<unsigned char> outgoing_;
+  std::array<unsigned char, 4096> scratch_{};
+  static constexpr uint32_t kLingerMs = 1000;
+  bool greeted_ = false;
+  bool closed_ = false;
+  uint64_t requestCount_ = 0;
+};
+
+}  // namespace ZinNet
+
+#endif

@@ -1,0 +1,36 @@
+// What the connections of a server share: the served transport, its request mutex, the options,
+// the log and the counters.
+#ifndef ZINNET_SRC_SERVERCORE_H
+#define ZINNET_SRC_SERVERCORE_H
+
+#include <atomic>
+#include <memory>
+#include <mutex>
+#include <string>
+
+#include "Asio.h"
+#include "ZinNet/Server.h"
+
+namespace ZinNet {
+
+struct ServerCore {
+  ServerCore(std::shared_ptr<ZinRT::Zin_Transport> t, ServerOptions o)
+      : transport(std::move(t)), options(std::move(o)) {}
+
+  void log(const std::string& line);
+  ServerStats snapshot() const;
+
+  std::shared_ptr<ZinRT::Zin_Transport> transport;
+  const ServerOptions options;
+  std::mutex requestMutex;  // held for each request carried out on the transport
+  std::mutex logMutex;
+  std::atomic<bool> stopping{false};
+  std::atomic<uint64_t> connectionsAccepted{0};
+  std::atomic<uint64_t> connectionsOpen{0};
+  std::atomic<uint64_t> requestsServed{0};
+  std::atomic<uint64_t> framesRefused{0};
+};
+
+}  // namespace ZinNet
+
+#endif
