@@ -25,5 +25,7 @@ write_basic_package_version_file(${CMAKE_BINARY_DIR}/ZinMOXConfigVersion.cmake
 install(FILES ${CMAKE_BINARY_DIR}/ZinMOXConfig.cmake ${CMAKE_BINARY_DIR}/ZinMOXConfigVersion.cmake
   DESTINATION ${ZIN_CMAKE_DIR})
 
+# The pkg-config file finds the prefix relative to its own folder, so the tree can be moved.
+file(RELATIVE_PATH ZIN_PC_TO_PREFIX "/prefix/${CMAKE_INSTALL_LIBDIR}/pkgconfig" "/prefix")
 configure_file(${PROJECT_SOURCE_DIR}/cmake/zinmox.pc.in ${CMAKE_BINARY_DIR}/zinmox.pc @ONLY)
 install(FILES ${CMAKE_BINARY_DIR}/zinmox.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
