@@ -39,13 +39,14 @@ int main() {
 
   ZINMOX_CORE_INFO info;
   if (ZinMOX_getInfo(handle, &ref, &info) != ZINMOX_SUCCESS) return 1;
-  std::printf("manufacturer id      %u\ncore type            %u\ncore version         %u.%u rev %u\n"
-              "qx version           %u.%u.%u\nasync inputs         %u\nsync inputs          %u\n"
-              "async outputs        %u\nsync outputs         %u\n",
-              info.manufacturer_id, info.core_type, info.core_major_version,
-              info.core_minor_version, info.core_revision, info.qx_major_version,
-              info.qx_minor_version, info.qx_minor_version_alpha, info.async_input_count,
-              info.sync_input_count, info.async_output_count, info.sync_output_count);
+  std::printf(
+      "manufacturer id      %u\ncore type            %u\ncore version         %u.%u rev %u\n"
+      "qx version           %u.%u.%u\nasync inputs         %u\nsync inputs          %u\n"
+      "async outputs        %u\nsync outputs         %u\n",
+      info.manufacturer_id, info.core_type, info.core_major_version, info.core_minor_version,
+      info.core_revision, info.qx_major_version, info.qx_minor_version, info.qx_minor_version_alpha,
+      info.async_input_count, info.sync_input_count, info.async_output_count,
+      info.sync_output_count);
 
   ZIN_CORE_REF empty{0, 0, 5};
   std::printf("asking for the information of an empty reference reports:\n");

@@ -83,11 +83,11 @@ ZINMOX_API uint32_t ZinMOX_setPortBits(uint32_t handle, ZIN_CORE_REF* coreRef,
 
 /* Reads whole input ports with their activity into packed vectors; null pointers are skipped and
    a count of 0 (else the port's width) fills none of that port's vectors. */
-ZINMOX_API uint32_t ZinMOX_getPortBits(uint32_t handle, ZIN_CORE_REF* coreRef,
-                                       uint8_t* asyncInData, uint8_t* asyncInActivityUp,
-                                       uint8_t* asyncInActivityDown, uint32_t asyncInDataBitCount,
-                                       uint8_t* syncInData, uint8_t* syncInActivityUp,
-                                       uint8_t* syncInActivityDown, uint8_t* syncInSyncActivityUp,
+ZINMOX_API uint32_t ZinMOX_getPortBits(uint32_t handle, ZIN_CORE_REF* coreRef, uint8_t* asyncInData,
+                                       uint8_t* asyncInActivityUp, uint8_t* asyncInActivityDown,
+                                       uint32_t asyncInDataBitCount, uint8_t* syncInData,
+                                       uint8_t* syncInActivityUp, uint8_t* syncInActivityDown,
+                                       uint8_t* syncInSyncActivityUp,
                                        uint8_t* syncInSyncActivityDown,
                                        uint32_t syncInDataBitCount);
 

@@ -3,6 +3,7 @@
 #define ZINMOX_COMMAND_H
 
 #include <cstdint>
+#include <cstring>
 #include <string>
 #include <vector>
 
@@ -44,10 +45,28 @@ class ZinMOX_Command {
   void setAsyncOutValueChar(uint32_t bit, char c) { asyncOutValueBits[bit] = c; }
   void setAsyncOutUpdateChar(uint32_t bit, char c) { asyncOutUpdateBits[bit] = c; }
   void setSyncOutUpdateChar(uint32_t bit, char c) { syncOutUpdateBits[bit] = c; }
-  void setPulseTrain(uint32_t bit, std::string steps) { syncOutPulseTrains[bit] = std::move(steps); }
+  void setPulseTrain(uint32_t bit, std::string steps) {
+    syncOutPulseTrains[bit] = std::move(steps);
+  }
   void setPulseTrainStep(uint32_t bit, uint32_t step, char c) { syncOutPulseTrains[bit][step] = c; }
   /// Holds one level on all steps of a synchronous output bit, without building a step string.
-  void holdPulseTrain(uint32_t bit, char level) { syncOutPulseTrains[bit].assign(STEP_COUNT, level); }
+  void holdPulseTrain(uint32_t bit, char level) {
+    std::string& steps = syncOutPulseTrains[bit];
+    if (steps.size() == STEP_COUNT) {
+      std::memset(steps.data(), level, STEP_COUNT);
+    } else {
+      steps.assign(STEP_COUNT, level);
+    }
+  }
+  /// Sets all STEP_COUNT step characters of a synchronous output bit from `steps`.
+  void setPulseTrainSteps(uint32_t bit, const char* steps) {
+    std::string& train = syncOutPulseTrains[bit];
+    if (train.size() == STEP_COUNT) {
+      std::memcpy(train.data(), steps, STEP_COUNT);
+    } else {
+      train.assign(steps, STEP_COUNT);
+    }
+  }
 
   void getAsyncInChars(uint32_t bit, char& value, char& activityUp, char& activityDown) const {
     value = asyncInValueBits[bit];
@@ -78,6 +97,12 @@ class ZinMOX_Command {
   const ZINMOX_CORE_INFO& getMoxCoreInfo() const { return moxCoreInfo; }
 
  private:
+  // D, the output data bits of the write line, concatenated.
+  std::string outputDataBits() const;
+  // Appends the hexadecimal text of D (`dataBits` characters) without building D; false when the
+  // image holds anything but '0'/'1' or irregular step strings (the caller converts D then).
+  bool appendDataHex(std::string& text, size_t dataBits) const;
+
   std::string asyncOutValueBits;
   std::vector<std::string> syncOutPulseTrains;
   std::string asyncOutUpdateBits;

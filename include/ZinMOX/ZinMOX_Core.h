@@ -74,7 +74,8 @@ class ZINMOX_API ZinMOX_Core : public Zin_SignalCore {
   void addReservedSignals();
   /// Defines a signal or bus. `signalType`: 0 synchronous output, 1 synchronous input,
   /// 2 asynchronous output, 3 asynchronous input. A failed call leaves the tables unchanged.
-  void defineSignal(const std::string& name, uint32_t signalType, std::vector<uint32_t>& bitIndexes);
+  void defineSignal(const std::string& name, uint32_t signalType,
+                    std::vector<uint32_t>& bitIndexes);
   /// Removes a signal: codes 1 and 3 search the inputs, any other code the outputs.
   void undefineSignal(const std::string& name, uint32_t signalType);
   /// Writes the widths of `count` named signals (outputs when `isOutput` is non-zero).

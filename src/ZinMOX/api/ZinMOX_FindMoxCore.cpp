@@ -13,10 +13,10 @@ ZinMOX_Core& findMoxCore(uint32_t handle, const ZIN_CORE_REF* coreRef, const cha
   if (core != nullptr && core->getCoreType() == CORE_TYPE_MOX) {
     if (auto* moxCore = dynamic_cast<ZinMOX_Core*>(core)) return *moxCore;
   }
-  throw std::logic_error("Data structures not initialized for MOX core Device:" +
-                         std::to_string(ref.deviceIndex) +
-                         ", user chain number:" + std::to_string(ref.userChainNumber) +
-                         ", core index:" + std::to_string(ref.coreIndex) + ".");
+  throw std::logic_error(
+      "Data structures not initialized for MOX core Device:" + std::to_string(ref.deviceIndex) +
+      ", user chain number:" + std::to_string(ref.userChainNumber) +
+      ", core index:" + std::to_string(ref.coreIndex) + ".");
 }
 
 }  // namespace ZinRT::mox

@@ -64,8 +64,8 @@ uint32_t ZinMOX_initCore(uint32_t handle, ZIN_CORE_REF* coreRef) {
     const ZIN_CORE_INFO info = readMoxStatus(
         handle, ref, status, "ZinMOX_initCore() for the wrong core type or non-existant core.");
     // Owned here until the core list takes it, so a failing initialisation does not leak it.
-    auto core = std::make_unique<ZinMOX_Core>(handle, ref, info, status.uPtr(),
-                                              status.getSize() * 8);
+    auto core =
+        std::make_unique<ZinMOX_Core>(handle, ref, info, status.uPtr(), status.getSize() * 8);
     core->initFromStatusWord(handle);
     Zin_CoreList::addCore(handle, core.get());
     core.release();

@@ -1,8 +1,12 @@
 // The port image of a MOX core: sizing, staging resets, command text and the two transfers.
 #include "ZinMOX/ZinMOX_Command.h"
 
+#include <algorithm>
+#include <array>
+#include <cstring>
 #include <memory>
 
+#include "command/ZinMOX_HexTextWriter.h"
 #include "framework/ZinMOX_Framework.h"
 
 namespace ZinRT {
@@ -17,6 +21,9 @@ constexpr uint32_t SYNC_IN_BITS = 6;
 constexpr uint32_t SYNC_OUT_BITS = ZinMOX_Command::STEP_COUNT + 1;
 // Further bits that the first read line shifts beyond the input data.
 constexpr uint32_t READ_TRAILER_BITS = 16;
+
+// Characters of a line without its data: "DD C I CC F LLLLLLLL " and the newline.
+constexpr size_t SHORT_LINE_LENGTH = 22 + 1;
 
 // "DD C I " of a core reference: two, one and one hex digits, each followed by a blank.
 void appendRefPrefix(std::string& text, const ZIN_CORE_REF& ref, std::string& scratch) {
@@ -39,6 +46,29 @@ void appendLine(std::string& text, const ZIN_CORE_REF& ref, uint32_t code, char 
   text += Zin_NumberUtil::uInt2HexStr(bitLength, 32, scratch);
   text += ' ';
   text += data;
+}
+
+// Character k of entry b is bit 7-k of byte b: a byte written as a number in base 2.
+constexpr std::array<std::array<char, 8>, 256> BYTE_BITS_MSB_FIRST = [] {
+  std::array<std::array<char, 8>, 256> table{};
+  for (unsigned b = 0; b < 256; ++b) {
+    for (unsigned k = 0; k < 8; ++k) table[b][k] = ((b >> (7 - k)) & 1u) != 0 ? '1' : '0';
+  }
+  return table;
+}();
+
+// The bit text B of the read data's n least significant bits, the number that the data spell
+// read most significant bit first: character j is bit n-1-j (bit i being bit i mod 8 of byte
+// i/8). Made straight from the bytes, without a round trip through hexadecimal digits.
+void readBitText(const unsigned char* data, uint32_t n, std::string& bits) {
+  bits.resize(n);
+  char* out = bits.data();
+  const uint32_t whole = n / 8;
+  const uint32_t rest = n % 8;
+  for (uint32_t q = 0; q < whole; ++q) {
+    std::memcpy(out + (n - 8 - 8 * q), BYTE_BITS_MSB_FIRST[data[q]].data(), 8);
+  }
+  if (rest != 0) std::memcpy(out, BYTE_BITS_MSB_FIRST[data[whole]].data() + (8 - rest), rest);
 }
 
 }  // namespace
@@ -73,16 +103,21 @@ std::string& ZinMOX_Command::buildCommandText(const ZIN_CORE_REF& coreRef, uint3
   const uint32_t sOut = moxCoreInfo.sync_output_count;
   switch (code) {
     case 1: {
-      std::string data;
-      data.reserve(2 * aOut + SYNC_OUT_BITS * sOut);
-      data += asyncOutValueBits;
-      for (const std::string& steps : syncOutPulseTrains) data += steps;
-      data += asyncOutUpdateBits;
-      data += syncOutUpdateBits;
-      const uint32_t bitLength = static_cast<uint32_t>(data.size()) + 1;
-      std::string hex;
-      Zin_NumberUtil::binStr2HexStr(data, hex);
-      appendLine(text, coreRef, 1, '0', bitLength, hex.empty() ? std::string("0") : hex, scratch);
+      // D: the asynchronous values, the step strings in bit order, then both update masks. Its
+      // hexadecimal text is written straight after the line's other fields.
+      const size_t dataBits =
+          2 * static_cast<size_t>(aOut) + SYNC_OUT_BITS * static_cast<size_t>(sOut);
+      // Room for this line and the short line that follows it in a write, so that neither the
+      // line nor the sequence is copied on growing.
+      text.reserve(dataBits / 4 + 2 * SHORT_LINE_LENGTH);
+      appendLine(text, coreRef, 1, '0', static_cast<uint32_t>(dataBits + 1), "", scratch);
+      const size_t dataStart = text.size();
+      if (dataBits == 0) {
+        text += '0';
+      } else if (!appendDataHex(text, dataBits)) {
+        text.resize(dataStart);
+        text += Zin_NumberUtil::binStr2HexStr(outputDataBits(), scratch);
+      }
       break;
     }
     case 2:
@@ -102,6 +137,25 @@ std::string& ZinMOX_Command::buildCommandText(const ZIN_CORE_REF& coreRef, uint3
       break;
   }
   return text;
+}
+
+std::string ZinMOX_Command::outputDataBits() const {
+  std::string data;
+  data += asyncOutValueBits;
+  for (const std::string& steps : syncOutPulseTrains) data += steps;
+  data += asyncOutUpdateBits;
+  data += syncOutUpdateBits;
+  return data;
+}
+
+bool ZinMOX_Command::appendDataHex(std::string& text, size_t dataBits) const {
+  if (!mox::kWordBitTexts) return false;
+  mox::HexTextWriter writer(text, dataBits);
+  if (!writer.add(asyncOutValueBits)) return false;
+  for (const std::string& steps : syncOutPulseTrains) {
+    if (steps.size() != STEP_COUNT || !writer.addSteps(steps.data())) return false;
+  }
+  return writer.add(asyncOutUpdateBits) && writer.add(syncOutUpdateBits) && writer.done();
 }
 
 void ZinMOX_Command::writeOutputs(uint32_t handle, const ZIN_CORE_REF& coreRef) {
@@ -125,11 +179,9 @@ void ZinMOX_Command::readInputs(uint32_t handle, const ZIN_CORE_REF& coreRef) {
   Zin_ByteBuffer readData(mox::byteCount(readBits), 0, 0);
   Zin_CoreComm::commandSequence(handle, text, readData.uPtr(), readBits, nullptr);
 
-  Zin_ByteBuffer hex;
-  readData.bin2HexString(0, hex);
   const uint32_t inputBits = ASYNC_IN_BITS * aIn + SYNC_IN_BITS * sIn;
   std::string bits;
-  Zin_NumberUtil::hexStr2BinStr(hex.ptr(), inputBits, bits);
+  readBitText(readData.uPtr(), inputBits, bits);
   const uint32_t asyncBits = inputBits - SYNC_IN_BITS * sIn;
   if (sIn != 0) unpackSyncInputs(bits.c_str() + asyncBits);
   if (aIn != 0) unpackAsyncInputs(bits.c_str());
@@ -137,21 +189,29 @@ void ZinMOX_Command::readInputs(uint32_t handle, const ZIN_CORE_REF& coreRef) {
 
 void ZinMOX_Command::unpackAsyncInputs(const char* bits) {
   const uint32_t count = moxCoreInfo.async_input_count;
+  char* value = asyncInValueBits.data();
+  char* up = asyncInActivityUpBits.data();
+  char* down = asyncInActivityDownBits.data();
   for (uint32_t i = 0; i < count; ++i, bits += ASYNC_IN_BITS) {
-    asyncInValueBits[i] = bits[0];
-    asyncInActivityUpBits[i] = bits[1];
-    asyncInActivityDownBits[i] = bits[2];
+    value[i] = bits[0];
+    up[i] = bits[1];
+    down[i] = bits[2];
   }
 }
 
 void ZinMOX_Command::unpackSyncInputs(const char* bits) {
   const uint32_t count = moxCoreInfo.sync_input_count;
+  char* value = syncInValueBits.data();
+  char* up = syncInActivityUpBits.data();
+  char* down = syncInActivityDownBits.data();
+  char* syncUp = syncInSyncActivityUpBits.data();
+  char* syncDown = syncInSyncActivityDownBits.data();
   for (uint32_t i = 0; i < count; ++i, bits += SYNC_IN_BITS) {
-    syncInValueBits[i] = bits[0];
-    syncInActivityUpBits[i] = bits[1];
-    syncInActivityDownBits[i] = bits[2];
-    syncInSyncActivityUpBits[i] = bits[3];
-    syncInSyncActivityDownBits[i] = bits[4];
+    value[i] = bits[0];
+    up[i] = bits[1];
+    down[i] = bits[2];
+    syncUp[i] = bits[3];
+    syncDown[i] = bits[4];
   }
 }
 

@@ -49,19 +49,30 @@ void ZinMOX_Core::getMoxCoreStatus(uint32_t /*handle*/, ZIN_CORE_REF /*coreRef*/
   // The minor version is ORed in, not added: a minor version of 16 or more overlaps the major.
   const uint32_t key = (coreInfo.coreMajorVersion << 4) | coreInfo.coreMinorVersion;
   if (key < FIRST_KEY_OF_101_LAYOUT) {
-    result->async_input_count = status.getBits(BEFORE_062_ASYNC_INPUT_COUNT_BIT_OFFSET, BEFORE_062_PORT_BIT_LEN);
-    result->sync_input_count = status.getBits(BEFORE_062_SYNC_INPUT_COUNT_BIT_OFFSET, BEFORE_062_PORT_BIT_LEN);
-    result->async_output_count = status.getBits(BEFORE_062_ASYNC_OUTPUT_COUNT_BIT_OFFSET, BEFORE_062_PORT_BIT_LEN);
-    result->sync_output_count = status.getBits(BEFORE_062_SYNC_OUTPUT_COUNT_BIT_OFFSET, BEFORE_062_PORT_BIT_LEN);
+    result->async_input_count =
+        status.getBits(BEFORE_062_ASYNC_INPUT_COUNT_BIT_OFFSET, BEFORE_062_PORT_BIT_LEN);
+    result->sync_input_count =
+        status.getBits(BEFORE_062_SYNC_INPUT_COUNT_BIT_OFFSET, BEFORE_062_PORT_BIT_LEN);
+    result->async_output_count =
+        status.getBits(BEFORE_062_ASYNC_OUTPUT_COUNT_BIT_OFFSET, BEFORE_062_PORT_BIT_LEN);
+    result->sync_output_count =
+        status.getBits(BEFORE_062_SYNC_OUTPUT_COUNT_BIT_OFFSET, BEFORE_062_PORT_BIT_LEN);
   } else if (key < FIRST_KEY_OF_FULL_LAYOUT) {
-    result->async_input_count = status.getBits(BEFORE_101_ASYNC_INPUT_COUNT_BIT_OFFSET, BEFORE_101_PORT_BIT_LEN);
-    result->sync_input_count = status.getBits(BEFORE_101_SYNC_INPUT_COUNT_BIT_OFFSET, BEFORE_101_PORT_BIT_LEN);
-    result->async_output_count = status.getBits(BEFORE_101_ASYNC_OUTPUT_COUNT_BIT_OFFSET, BEFORE_101_PORT_BIT_LEN);
-    result->sync_output_count = status.getBits(BEFORE_101_SYNC_OUTPUT_COUNT_BIT_OFFSET, BEFORE_101_PORT_BIT_LEN);
+    result->async_input_count =
+        status.getBits(BEFORE_101_ASYNC_INPUT_COUNT_BIT_OFFSET, BEFORE_101_PORT_BIT_LEN);
+    result->sync_input_count =
+        status.getBits(BEFORE_101_SYNC_INPUT_COUNT_BIT_OFFSET, BEFORE_101_PORT_BIT_LEN);
+    result->async_output_count =
+        status.getBits(BEFORE_101_ASYNC_OUTPUT_COUNT_BIT_OFFSET, BEFORE_101_PORT_BIT_LEN);
+    result->sync_output_count =
+        status.getBits(BEFORE_101_SYNC_OUTPUT_COUNT_BIT_OFFSET, BEFORE_101_PORT_BIT_LEN);
   } else {
-    result->qx_major_version = status.getBits(QX_MAJOR_VERSION_BIT_OFFSET, QX_MAJOR_VERSION_BIT_LEN);
-    result->qx_minor_version = status.getBits(QX_MINOR_VERSION_BIT_OFFSET, QX_MINOR_VERSION_BIT_LEN);
-    result->qx_minor_version_alpha = status.getBits(QX_MINOR_VERSION_ALPHA_BIT_OFFSET, QX_MINOR_VERSION_ALPHA_BIT_LEN);
+    result->qx_major_version =
+        status.getBits(QX_MAJOR_VERSION_BIT_OFFSET, QX_MAJOR_VERSION_BIT_LEN);
+    result->qx_minor_version =
+        status.getBits(QX_MINOR_VERSION_BIT_OFFSET, QX_MINOR_VERSION_BIT_LEN);
+    result->qx_minor_version_alpha =
+        status.getBits(QX_MINOR_VERSION_ALPHA_BIT_OFFSET, QX_MINOR_VERSION_ALPHA_BIT_LEN);
     result->async_input_count = status.getBits(ASYNC_INPUT_COUNT_BIT_OFFSET, PORT_BIT_LEN);
     result->sync_input_count = status.getBits(SYNC_INPUT_COUNT_BIT_OFFSET, PORT_BIT_LEN);
     result->async_output_count = status.getBits(ASYNC_OUTPUT_COUNT_BIT_OFFSET, PORT_BIT_LEN);

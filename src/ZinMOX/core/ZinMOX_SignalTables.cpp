@@ -20,15 +20,26 @@ struct PortSelection {
 
 bool selectPort(uint32_t signalType, const ZINMOX_CORE_INFO& info, PortSelection& port) {
   switch (signalType) {
-    case 0: port = {false, Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_OUTPUT, info.sync_output_count}; return true;
-    case 1: port = {true, Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT, info.sync_input_count}; return true;
-    case 2: port = {false, Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_OUTPUT, info.async_output_count}; return true;
-    case 3: port = {true, Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_INPUT, info.async_input_count}; return true;
-    default: return false;
+    case 0:
+      port = {false, Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_OUTPUT, info.sync_output_count};
+      return true;
+    case 1:
+      port = {true, Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT, info.sync_input_count};
+      return true;
+    case 2:
+      port = {false, Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_OUTPUT, info.async_output_count};
+      return true;
+    case 3:
+      port = {true, Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_INPUT, info.async_input_count};
+      return true;
+    default:
+      return false;
   }
 }
 
-bool isInputCode(uint32_t signalType) { return signalType == 1 || signalType == 3; }
+bool isInputCode(uint32_t signalType) {
+  return signalType == 1 || signalType == 3;
+}
 
 ZinMOX_SignalGroup* lookUp(ZinMOX_SignalTable& table, const std::string& name) {
   auto found = table.find(name);
@@ -64,7 +75,8 @@ void ZinMOX_Core::defineSignal(const std::string& name, uint32_t signalType,
                            ", is already used by another signal and will not be re-defined. "
                            "Note: Signal names are case-insensitive");
   }
-  auto group = std::make_unique<ZinMOX_SignalGroup>(&command, port.groupType, bitIndexes, name, name);
+  auto group =
+      std::make_unique<ZinMOX_SignalGroup>(&command, port.groupType, bitIndexes, name, name);
   table.emplace(group->getKeyName(), group.get());
   group.release();
 }

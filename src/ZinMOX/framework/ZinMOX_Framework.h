@@ -32,10 +32,14 @@ inline constexpr uint32_t STATUS_BUFFER_RESERVE = 10;
 inline constexpr uint32_t STATUS_BUFFER_GROW = 10;
 
 /// A signal type with the group flag removed.
-inline uint32_t plainSignalType(uint32_t type) { return type & ~Zin_SignalBase::SIGNAL_TYPE_GROUP; }
+inline uint32_t plainSignalType(uint32_t type) {
+  return type & ~Zin_SignalBase::SIGNAL_TYPE_GROUP;
+}
 
 /// Number of bytes of a packed vector of `bits` bits.
-inline uint32_t byteCount(uint32_t bits) { return bits / 8 + (bits % 8 != 0 ? 1 : 0); }
+inline uint32_t byteCount(uint32_t bits) {
+  return bits / 8 + (bits % 8 != 0 ? 1 : 0);
+}
 
 }  // namespace ZinRT::mox
 

@@ -14,8 +14,23 @@ inline bool packedBit(const uint8_t* bytes, uint32_t bit) {
   return ((bytes[bit / 8] >> (bit % 8)) & 1u) != 0;
 }
 
-inline void orPackedBit(uint8_t* bytes, uint32_t bit, char character) {
-  if (bytes != nullptr && character == '1') bytes[bit / 8] |= static_cast<uint8_t>(1u << (bit % 8));
+// ORs value bit i into `packed` (skipped when null) wherever the image character of port bit
+// positions[i] is '1'; other characters leave the bit as it was. Eight bits are gathered in a
+// register before each byte is touched.
+void collectBits(const std::string& image, const uint32_t* positions, uint32_t n, uint8_t* packed) {
+  if (packed == nullptr) return;
+  const char* chars = image.data();
+  uint32_t i = 0;
+  for (; i + 8 <= n; i += 8) {
+    unsigned byte = 0;
+    for (unsigned k = 0; k < 8; ++k) byte |= (chars[positions[i + k]] == '1' ? 1u : 0u) << k;
+    packed[i / 8] |= static_cast<uint8_t>(byte);
+  }
+  if (i < n) {
+    unsigned byte = 0;
+    for (unsigned k = 0; i + k < n; ++k) byte |= (chars[positions[i + k]] == '1' ? 1u : 0u) << k;
+    packed[i / 8] |= static_cast<uint8_t>(byte);
+  }
 }
 
 bool isInputType(uint32_t type) {
@@ -27,7 +42,8 @@ bool isInputType(uint32_t type) {
 // collecting an output would index another port's image.
 void checkDirection(uint32_t type, bool wantInput, const std::string& name) {
   if (isInputType(type) != wantInput) {
-    throw std::logic_error(std::string(wantInput ? "Not an input signal: " : "Not an output signal: ") + name);
+    throw std::logic_error(
+        std::string(wantInput ? "Not an input signal: " : "Not an output signal: ") + name);
   }
 }
 
@@ -98,23 +114,17 @@ void ZinMOX_SignalGroup::getValues(uint8_t* value, uint8_t* activityUp, uint8_t*
   if (byteSize < mox::byteCount(n)) failTooSmall(getName());
   checkDirection(type, true, getName());
 
-  char level, up, down, syncUp, syncDown;
+  const uint32_t* at = positions.data();
   if (type == Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT) {
-    for (uint32_t i = 0; i < n; ++i) {
-      command->getSyncInChars(positions[i], level, up, down, syncUp, syncDown);
-      orPackedBit(value, i, level);
-      orPackedBit(activityUp, i, up);
-      orPackedBit(activityDown, i, down);
-      orPackedBit(syncActivityUp, i, syncUp);
-      orPackedBit(syncActivityDown, i, syncDown);
-    }
+    collectBits(command->getSyncInValueBits(), at, n, value);
+    collectBits(command->getSyncInActivityUpBits(), at, n, activityUp);
+    collectBits(command->getSyncInActivityDownBits(), at, n, activityDown);
+    collectBits(command->getSyncInSyncActivityUpBits(), at, n, syncActivityUp);
+    collectBits(command->getSyncInSyncActivityDownBits(), at, n, syncActivityDown);
   } else {
-    for (uint32_t i = 0; i < n; ++i) {
-      command->getAsyncInChars(positions[i], level, up, down);
-      orPackedBit(value, i, level);
-      orPackedBit(activityUp, i, up);
-      orPackedBit(activityDown, i, down);
-    }
+    collectBits(command->getAsyncInValueBits(), at, n, value);
+    collectBits(command->getAsyncInActivityUpBits(), at, n, activityUp);
+    collectBits(command->getAsyncInActivityDownBits(), at, n, activityDown);
   }
 }
 

@@ -15,14 +15,16 @@ bool isSyncInput(const ZinMOX_SignalGroup& group) {
   return mox::plainSignalType(group.getType()) == Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT;
 }
 
-// The hexadecimal text of a signal's packed vector.
-std::string vectorText(const Zin_ByteBuffer& vector, uint32_t width) {
+// Stores the hexadecimal text of a signal's packed vector under `key`, reusing the entry's
+// storage when the key is already there.
+void storeText(ZinMOX_ValueMap& map, const std::string& key, const Zin_ByteBuffer& vector,
+               uint32_t width) {
   std::unique_ptr<Zin_ByteBuffer> text(vector.bin2HexString(0, width));
-  return std::string(text->ptr());
+  map[key].assign(text->ptr(), text->getSize());
 }
 
 // Writes one signal's value and activity texts under its name and suffixed keys.
-void reportSignal(const ZinMOX_SignalGroup& group, ZinMOX_ValueMap& map) {
+void reportSignal(const ZinMOX_SignalGroup& group, ZinMOX_ValueMap& map, std::string& key) {
   const uint32_t width = group.size();
   const uint32_t bytes = mox::byteCount(width);
   const bool sync = isSyncInput(group);
@@ -32,14 +34,19 @@ void reportSignal(const ZinMOX_SignalGroup& group, ZinMOX_ValueMap& map) {
                   sync ? syncDown.uPtr() : nullptr, bytes);
 
   const std::string& name = group.getKeyName();
-  std::string valueText = vectorText(value, width);
-  map[name] = valueText;
-  map[name + ".value"] = std::move(valueText);
-  map[name + ".activity_up"] = vectorText(up, width);
-  map[name + ".activity_down"] = vectorText(down, width);
+  storeText(map, name, value, width);
+  const size_t nameLength = name.size();
+  const auto keyOf = [&](const char* suffix) -> const std::string& {
+    key.assign(name, 0, nameLength);
+    key += suffix;
+    return key;
+  };
+  map[keyOf(".value")] = map[name];
+  storeText(map, keyOf(".activity_up"), up, width);
+  storeText(map, keyOf(".activity_down"), down, width);
   if (sync) {
-    map[name + ".sync_activity_up"] = vectorText(syncUp, width);
-    map[name + ".sync_activity_down"] = vectorText(syncDown, width);
+    storeText(map, keyOf(".sync_activity_up"), syncUp, width);
+    storeText(map, keyOf(".sync_activity_down"), syncDown, width);
   }
 }
 
@@ -55,7 +62,8 @@ void ZinMOX_Core::readValues(uint32_t handle, ZIN_CORE_REF coreRef, ZinMOX_Value
     throw std::logic_error("ZinMOX_Core::readValues() arg. failed:inputHashMap!=0");
   }
   command.readInputs(handle, coreRef);
-  for (const auto& entry : inputSignals) reportSignal(*entry.second, *inputHashMap);
+  std::string key;  // the suffixed keys are built in one string
+  for (const auto& entry : inputSignals) reportSignal(*entry.second, *inputHashMap, key);
 }
 
 void ZinMOX_Core::readValues(uint32_t handle, ZIN_CORE_REF coreRef,

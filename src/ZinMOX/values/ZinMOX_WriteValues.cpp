@@ -71,11 +71,12 @@ void ZinMOX_Core::writeValues(uint32_t handle, ZIN_CORE_REF coreRef,
 
 void ZinMOX_Core::writeValues(uint32_t handle, ZIN_CORE_REF coreRef,
                               std::vector<std::string> signalNames, const uint8_t* const* values,
-                              const uint32_t* valueSizes, uint32_t signalCount,
-                              uint32_t valueCount, uint32_t burstMode) {
+                              const uint32_t* valueSizes, uint32_t signalCount, uint32_t valueCount,
+                              uint32_t burstMode) {
   // The arrays are read for every entry: check that they exist before anything is staged.
   if (signalCount > signalNames.size()) {
-    throw std::logic_error("ZinMOX_Core::writeValues() arg. failed:signalCount<=signalNames.size()");
+    throw std::logic_error(
+        "ZinMOX_Core::writeValues() arg. failed:signalCount<=signalNames.size()");
   }
   if (signalCount != 0 && values == nullptr) {
     throw std::logic_error("ZinMOX_Core::writeValues() arg. failed:values!=0");
