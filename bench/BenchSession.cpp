@@ -13,7 +13,9 @@ namespace {
 
 thread_local std::string lastMessage;
 
-void keepMessage(void*, uint32_t, uint32_t, const char* text) { lastMessage = text; }
+void keepMessage(void*, uint32_t, uint32_t, const char* text) {
+  lastMessage = text;
+}
 
 ZinTarget::MoxStatus statusOf(uint32_t width) {
   ZinTarget::MoxStatus status;
@@ -32,7 +34,9 @@ BenchSession::BenchSession(benchmark::State& state, uint32_t width) : state_(sta
   check(ZinMOX_initCore(handle_, &ref_), "ZinMOX_initCore");
 }
 
-BenchSession::~BenchSession() { ZinJtag_closeSession(handle_); }
+BenchSession::~BenchSession() {
+  ZinJtag_closeSession(handle_);
+}
 
 bool BenchSession::check(uint32_t result, const char* what) {
   if (result == ZINMOX_SUCCESS) return true;

@@ -42,7 +42,9 @@ inline double readWireBits(uint32_t asyncIn, uint32_t syncIn) {
   return 4.0 * asyncIn + 6.0 * syncIn + 16 + 4;
 }
 /// Records the bits a call moves, read by scripts/bench.py.
-inline void setWireBits(benchmark::State& state, double bits) { state.counters["wire_bits"] = bits; }
+inline void setWireBits(benchmark::State& state, double bits) {
+  state.counters["wire_bits"] = bits;
+}
 
 }  // namespace ZinBench
 

@@ -28,9 +28,9 @@ void BM_SetPortBits(benchmark::State& state) {
   const std::vector<uint8_t> asyncData = pattern(bytes, 1), asyncMask = pattern(bytes, 2);
   const std::vector<uint8_t> syncData = pattern(16 * bytes, 3), syncMask = pattern(bytes, 4);
   for (auto _ : state) {
-    const uint32_t result = ZinMOX_setPortBits(session.handle(), session.ref(), asyncData.data(),
-                                               asyncMask.data(), width, syncData.data(),
-                                               syncMask.data(), width);
+    const uint32_t result =
+        ZinMOX_setPortBits(session.handle(), session.ref(), asyncData.data(), asyncMask.data(),
+                           width, syncData.data(), syncMask.data(), width);
     if (!session.check(result, "ZinMOX_setPortBits")) break;
   }
   setWireBits(state, writeWireBits(width, width));

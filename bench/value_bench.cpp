@@ -18,7 +18,9 @@ using ZinRT::ZinMOX_ValueMap;
 constexpr uint32_t kSmallWidth = 8;
 constexpr uint32_t kSmallBus[kSmallWidth] = {0, 1, 2, 3, 4, 5, 6, 7};
 
-uintptr_t mapWord(ZinMOX_ValueMap& map) { return reinterpret_cast<uintptr_t>(&map); }
+uintptr_t mapWord(ZinMOX_ValueMap& map) {
+  return reinterpret_cast<uintptr_t>(&map);
+}
 
 // A hexadecimal text of `digits` digits in an irregular pattern.
 std::string hexText(size_t digits, uint32_t seed) {

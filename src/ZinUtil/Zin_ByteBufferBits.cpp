@@ -1,4 +1,5 @@
 // Bit fields and hexadecimal texts of a byte buffer.
+#include <algorithm>
 #include <cstring>
 #include <memory>
 #include <stdexcept>
@@ -53,14 +54,27 @@ Zin_ByteBuffer* Zin_ByteBuffer::bin2HexString(uint32_t start, uint32_t bitCount)
   auto text = std::make_unique<Zin_ByteBuffer>(digitCount, 0, 0);
   char* digits = text->ptr();
   const unsigned char* bytes = uPtr();
-  // Digit k (counted from the least significant) is nibble k of the bits from byte `start`.
-  for (uint32_t k = 0; k < digitCount; ++k) {
+  // Digit k (counted from the least significant) is nibble k of the bits from byte `start`;
+  // whole bytes give two digits at once, bytes past the end read as zero.
+  const uint64_t available = start < size_ ? size_ - start : 0;
+  const uint32_t wholeBytes = static_cast<uint32_t>(std::min<uint64_t>(digitCount / 2, available));
+  char* end = digits + digitCount;
+  for (uint32_t i = 0; i < wholeBytes; ++i) {
+    const unsigned char b = bytes[start + i];
+    end[-2 * static_cast<int64_t>(i) - 1] = detail::kHexDigits[b & 0x0F];
+    end[-2 * static_cast<int64_t>(i) - 2] = detail::kHexDigits[b >> 4];
+  }
+  for (uint32_t k = 2 * wholeBytes; k < digitCount; ++k) {
     const uint64_t index = static_cast<uint64_t>(start) + k / 2;
     unsigned nibble = 0;
     if (index < size_) nibble = (k % 2 == 0) ? (bytes[index] & 0x0F) : (bytes[index] >> 4);
-    // Bits beyond bitCount in the most significant digit are not part of the value.
-    if (k == digitCount - 1 && bitCount % 4 != 0) nibble &= (1u << (bitCount % 4)) - 1;
     digits[digitCount - 1 - k] = detail::kHexDigits[nibble];
+  }
+  // Bits beyond bitCount in the most significant digit are not part of the value.
+  if (bitCount % 4 != 0) {
+    const unsigned top =
+        static_cast<unsigned>(detail::kHexValues[static_cast<unsigned char>(digits[0])]);
+    digits[0] = detail::kHexDigits[top & ((1u << (bitCount % 4)) - 1)];
   }
   return text.release();
 }
@@ -77,8 +91,10 @@ Zin_ByteBuffer* Zin_ByteBuffer::hex2Bin(uint32_t first, uint32_t last) const {
   const char* text = ptr();
   unsigned char* bytes = bin->uPtr();
   // The last digit is the least significant: digit pairs fill the bytes from byte 0 upwards.
+  // A bad digit is reported as the conversion meets it, from the last digit on.
   for (uint32_t k = 0; k < digitCount; ++k) {
-    const int v = detail::hexValue(text[last - k], "Zin_ByteBuffer::hex2Bin");
+    int v = detail::kHexValues[static_cast<unsigned char>(text[last - k])];
+    if (v < 0) v = detail::hexValue(text[last - k], "Zin_ByteBuffer::hex2Bin");
     bytes[k / 2] |= static_cast<unsigned char>(k % 2 == 0 ? v : v << 4);
   }
   return bin.release();

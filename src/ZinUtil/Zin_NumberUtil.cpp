@@ -9,6 +9,7 @@
 #include <functional>
 #include <stdexcept>
 
+#include "Zin_BitWords.h"
 #include "Zin_HexDigits.h"
 
 namespace ZinRT {
@@ -24,11 +25,46 @@ constexpr std::array<std::array<char, 8>, 256> kReverseBits = [] {
   return table;
 }();
 
+// The four-character bit text of each digit value, most significant bit first.
+constexpr std::array<std::array<char, 4>, 16> kDigitBits = [] {
+  std::array<std::array<char, 4>, 16> table{};
+  for (unsigned v = 0; v < 16; ++v) {
+    for (unsigned j = 0; j < 4; ++j) table[v][j] = ((v >> (3 - j)) & 1u) != 0 ? '1' : '0';
+  }
+  return table;
+}();
+
+// The two hexadecimal digits of each byte value.
+constexpr std::array<std::array<char, 2>, 256> kByteDigits = [] {
+  std::array<std::array<char, 2>, 256> table{};
+  for (unsigned b = 0; b < 256; ++b) {
+    table[b][0] = detail::kHexDigits[b >> 4];
+    table[b][1] = detail::kHexDigits[b & 0x0F];
+  }
+  return table;
+}();
+
 unsigned bitValue(char c) {
   if (c == '0') return 0;
   if (c == '1') return 1;
   throw std::invalid_argument("Zin_NumberUtil::binStr2HexStr: not a bit character (code " +
                               std::to_string(static_cast<unsigned char>(c)) + ")");
+}
+
+// The value of `count` bit characters, most significant first; throws on the first bad one.
+unsigned bitsValue(const char* bits, size_t count) {
+  unsigned v = 0;
+  for (size_t j = 0; j < count; ++j) v = (v << 1) | bitValue(bits[j]);
+  return v;
+}
+
+// Eight bit characters as a byte, most significant first; throws on the first bad one.
+unsigned bitByte(const char* bits) {
+  if constexpr (detail::kWordBitTexts) {
+    const uint64_t word = detail::loadWord(bits);
+    if (detail::isBitWord(word)) return detail::bitWordMsbFirst(word);
+  }
+  return bitsValue(bits, 8);
 }
 
 }  // namespace
@@ -60,16 +96,20 @@ std::string& Zin_NumberUtil::binStr2HexStr(const std::string& bits, std::string&
   }
   const size_t n = bits.size();
   const size_t digitCount = (n + 3) / 4;
-  const size_t pad = 4 * digitCount - n;  // zeros that stand left of the first bit
-  out.assign(digitCount, '0');
-  for (size_t d = 0; d < digitCount; ++d) {
-    unsigned v = 0;
-    for (size_t j = 0; j < 4; ++j) {
-      const size_t pos = 4 * d + j;  // position in the padded text
-      v = (v << 1) | (pos < pad ? 0u : bitValue(bits[pos - pad]));
-    }
-    out[d] = detail::kHexDigits[v];
+  out.resize(digitCount);
+  const char* in = bits.data();
+  char* digits = out.data();
+  // The text is padded with zeros on the left to whole digits: the first digit takes the
+  // leading n mod 4 characters, every further digit four.
+  const size_t head = n % 4;
+  size_t pos = 0;
+  if (head != 0) {
+    *digits++ = detail::kHexDigits[bitsValue(in, head)];
+    pos = head;
   }
+  for (; pos + 8 <= n; pos += 8, digits += 2)
+    std::memcpy(digits, kByteDigits[bitByte(in + pos)].data(), 2);
+  if (pos < n) *digits = detail::kHexDigits[bitsValue(in + pos, 4)];
   return out;
 }
 
@@ -81,16 +121,27 @@ std::string& Zin_NumberUtil::hexStr2BinStr(const char* hex, uint32_t bitCount, s
     return hexStr2BinStr(copy.c_str(), bitCount, out);
   }
   const size_t len = std::strlen(hex);
-  std::string& bits = out;
-  bits.assign(bitCount, '0');
-  // Digit k from the end carries bits 4k to 4k+3 of the number; bit s lands at bitCount-1-s.
-  for (size_t k = 0; k < len; ++k) {
-    const unsigned v =
-        static_cast<unsigned>(detail::hexValue(hex[len - 1 - k], "Zin_NumberUtil::hexStr2BinStr"));
-    for (unsigned j = 0; j < 4; ++j) {
-      const uint64_t s = 4 * static_cast<uint64_t>(k) + j;
-      if (s < bitCount && ((v >> j) & 1u) != 0) bits[bitCount - 1 - s] = '1';
+  // Every digit is checked, also those above the kept bits, the least significant first.
+  for (size_t k = len; k-- > 0;) {
+    if (detail::kHexValues[static_cast<unsigned char>(hex[k])] < 0) {
+      detail::hexValue(hex[k], "Zin_NumberUtil::hexStr2BinStr");
     }
+  }
+  out.assign(bitCount, '0');
+  // Digit k from the end carries bits 4k to 4k+3 of the number; bit s lands at bitCount-1-s, so
+  // the digit's four characters end at bitCount-4k.
+  char* bits = out.data();
+  const size_t whole = std::min<size_t>(len, bitCount / 4);
+  for (size_t k = 0; k < whole; ++k) {
+    const auto v =
+        static_cast<unsigned>(detail::kHexValues[static_cast<unsigned char>(hex[len - 1 - k])]);
+    std::memcpy(bits + bitCount - 4 * (k + 1), kDigitBits[v].data(), 4);
+  }
+  const size_t part = bitCount % 4;
+  if (whole < len && part != 0) {
+    const auto v =
+        static_cast<unsigned>(detail::kHexValues[static_cast<unsigned char>(hex[len - 1 - whole])]);
+    std::memcpy(bits, kDigitBits[v].data() + (4 - part), part);
   }
   return out;
 }
@@ -114,12 +165,22 @@ unsigned char* Zin_NumberUtil::reverseBinStr2Bin(const std::string& bits, unsign
     if (n == 0) return out;
     throw std::invalid_argument("Zin_NumberUtil::reverseBinStr2Bin: null output");
   }
-  const size_t byteCount = (n + 7) / 8;
-  for (size_t i = 0; i < byteCount; ++i) {
+  const char* in = bits.data();
+  const size_t whole = n / 8;
+  for (size_t i = 0; i < whole; ++i) {
+    if constexpr (detail::kWordBitTexts) {
+      out[i] = static_cast<unsigned char>(detail::onesWordLsbFirst(detail::loadWord(in + 8 * i)));
+    } else {
+      unsigned b = 0;
+      for (size_t j = 0; j < 8; ++j) b |= (in[8 * i + j] == '1' ? 1u : 0u) << j;
+      out[i] = static_cast<unsigned char>(b);
+    }
+  }
+  if (n % 8 != 0) {
     unsigned b = 0;
-    const size_t end = std::min(n, 8 * i + 8);
-    for (size_t pos = 8 * i; pos < end; ++pos) b |= (bits[pos] == '1' ? 1u : 0u) << (pos - 8 * i);
-    out[i] = static_cast<unsigned char>(b);
+    for (size_t pos = 8 * whole; pos < n; ++pos)
+      b |= (in[pos] == '1' ? 1u : 0u) << (pos - 8 * whole);
+    out[whole] = static_cast<unsigned char>(b);
   }
   return out;
 }
