@@ -266,4 +266,45 @@ TEST_F(CoreLifecycle, EveryCallTakesTheTargetLock) {
   expectNoMessages();
 }
 
+TEST_F(CoreLifecycle, ANullCoreReferenceIsAFailureNotACrash) {
+  initMoxCore(ref, 2, 2, 2, 2);
+  ZINMOX_CORE_INFO info{};
+  uint32_t isMox = 0;
+  ZinMOX_ValueMap map;
+  uintptr_t word = mapWord(map);
+  const uint32_t bits[] = {1};
+  const char* names[] = {"async_out_data"};
+  uint32_t sizes[1] = {0};
+  const std::vector<std::function<uint32_t()>> calls = {
+      [&] { return ZinMOX_getInfo(handle, nullptr, &info); },
+      [&] { return ZinMOX_isMOXCore(handle, nullptr, &isMox); },
+      [&] { return ZinMOX_initCore(handle, nullptr); },
+      [&] { return ZinMOX_terminateCore(handle, nullptr); },
+      [&] { return ZinMOX_getCoreInfo(handle, nullptr, &word); },
+      [&] { return ZinMOX_defineSignal(handle, nullptr, "s", 0, 0); },
+      [&] { return ZinMOX_defineBus(handle, nullptr, "b", 0, bits, 1); },
+      [&] { return ZinMOX_undefineName(handle, nullptr, "b", 0); },
+      [&] { return ZinMOX_getSignalSizes(handle, nullptr, names, sizes, 1, 1); },
+      [&] { return ZinMOX_setPortBits(handle, nullptr, nullptr, nullptr, 0, nullptr, nullptr, 0); },
+      [&] {
+        return ZinMOX_getPortBits(handle, nullptr, nullptr, nullptr, nullptr, 0, nullptr, nullptr,
+                                  nullptr, nullptr, nullptr, 0);
+      },
+      [&] { return ZinMOX_writeValues(handle, nullptr, &word); },
+      [&] { return ZinMOX_readValues(handle, nullptr, &word); },
+  };
+  for (std::size_t i = 0; i < calls.size(); ++i) {
+    SCOPED_TRACE(testing::Message() << "call " << i);
+    EXPECT_EQ(calls[i](), kFailure);
+    std::vector<RecordedMessage> recorded = messages();
+    ASSERT_EQ(recorded.size(), 1u);
+    EXPECT_EQ(recorded[0].code, kErrorCode);
+    EXPECT_NE(recorded[0].text.find("coreRef"), std::string::npos) << recorded[0].text;
+    clearMessages();
+  }
+  EXPECT_TRUE(map.empty());
+  EXPECT_TRUE(transport->transfers().empty());
+  EXPECT_NE(registeredCore(ref), nullptr);
+}
+
 }  // namespace
