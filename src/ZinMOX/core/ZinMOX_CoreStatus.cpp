@@ -32,6 +32,19 @@ namespace {
 constexpr uint32_t FIRST_KEY_OF_101_LAYOUT = 0x62;
 constexpr uint32_t FIRST_KEY_OF_FULL_LAYOUT = 0xA0;
 
+// Where a layout keeps the four port counts.
+struct CountFields {
+  unsigned int asyncInputOffset, syncInputOffset, asyncOutputOffset, syncOutputOffset, length;
+};
+
+// Fields are read in ascending bit order.
+void readCounts(Zin_ByteBuffer& status, const CountFields& fields, ZINMOX_CORE_INFO* result) {
+  result->async_input_count = status.getBits(fields.asyncInputOffset, fields.length);
+  result->sync_input_count = status.getBits(fields.syncInputOffset, fields.length);
+  result->async_output_count = status.getBits(fields.asyncOutputOffset, fields.length);
+  result->sync_output_count = status.getBits(fields.syncOutputOffset, fields.length);
+}
+
 }  // namespace
 
 void ZinMOX_Core::getMoxCoreStatus(uint32_t /*handle*/, ZIN_CORE_REF /*coreRef*/,
@@ -49,23 +62,17 @@ void ZinMOX_Core::getMoxCoreStatus(uint32_t /*handle*/, ZIN_CORE_REF /*coreRef*/
   // The minor version is ORed in, not added: a minor version of 16 or more overlaps the major.
   const uint32_t key = (coreInfo.coreMajorVersion << 4) | coreInfo.coreMinorVersion;
   if (key < FIRST_KEY_OF_101_LAYOUT) {
-    result->async_input_count =
-        status.getBits(BEFORE_062_ASYNC_INPUT_COUNT_BIT_OFFSET, BEFORE_062_PORT_BIT_LEN);
-    result->sync_input_count =
-        status.getBits(BEFORE_062_SYNC_INPUT_COUNT_BIT_OFFSET, BEFORE_062_PORT_BIT_LEN);
-    result->async_output_count =
-        status.getBits(BEFORE_062_ASYNC_OUTPUT_COUNT_BIT_OFFSET, BEFORE_062_PORT_BIT_LEN);
-    result->sync_output_count =
-        status.getBits(BEFORE_062_SYNC_OUTPUT_COUNT_BIT_OFFSET, BEFORE_062_PORT_BIT_LEN);
+    readCounts(status,
+               {BEFORE_062_ASYNC_INPUT_COUNT_BIT_OFFSET, BEFORE_062_SYNC_INPUT_COUNT_BIT_OFFSET,
+                BEFORE_062_ASYNC_OUTPUT_COUNT_BIT_OFFSET, BEFORE_062_SYNC_OUTPUT_COUNT_BIT_OFFSET,
+                BEFORE_062_PORT_BIT_LEN},
+               result);
   } else if (key < FIRST_KEY_OF_FULL_LAYOUT) {
-    result->async_input_count =
-        status.getBits(BEFORE_101_ASYNC_INPUT_COUNT_BIT_OFFSET, BEFORE_101_PORT_BIT_LEN);
-    result->sync_input_count =
-        status.getBits(BEFORE_101_SYNC_INPUT_COUNT_BIT_OFFSET, BEFORE_101_PORT_BIT_LEN);
-    result->async_output_count =
-        status.getBits(BEFORE_101_ASYNC_OUTPUT_COUNT_BIT_OFFSET, BEFORE_101_PORT_BIT_LEN);
-    result->sync_output_count =
-        status.getBits(BEFORE_101_SYNC_OUTPUT_COUNT_BIT_OFFSET, BEFORE_101_PORT_BIT_LEN);
+    readCounts(status,
+               {BEFORE_101_ASYNC_INPUT_COUNT_BIT_OFFSET, BEFORE_101_SYNC_INPUT_COUNT_BIT_OFFSET,
+                BEFORE_101_ASYNC_OUTPUT_COUNT_BIT_OFFSET, BEFORE_101_SYNC_OUTPUT_COUNT_BIT_OFFSET,
+                BEFORE_101_PORT_BIT_LEN},
+               result);
   } else {
     result->qx_major_version =
         status.getBits(QX_MAJOR_VERSION_BIT_OFFSET, QX_MAJOR_VERSION_BIT_LEN);
@@ -73,10 +80,10 @@ void ZinMOX_Core::getMoxCoreStatus(uint32_t /*handle*/, ZIN_CORE_REF /*coreRef*/
         status.getBits(QX_MINOR_VERSION_BIT_OFFSET, QX_MINOR_VERSION_BIT_LEN);
     result->qx_minor_version_alpha =
         status.getBits(QX_MINOR_VERSION_ALPHA_BIT_OFFSET, QX_MINOR_VERSION_ALPHA_BIT_LEN);
-    result->async_input_count = status.getBits(ASYNC_INPUT_COUNT_BIT_OFFSET, PORT_BIT_LEN);
-    result->sync_input_count = status.getBits(SYNC_INPUT_COUNT_BIT_OFFSET, PORT_BIT_LEN);
-    result->async_output_count = status.getBits(ASYNC_OUTPUT_COUNT_BIT_OFFSET, PORT_BIT_LEN);
-    result->sync_output_count = status.getBits(SYNC_OUTPUT_COUNT_BIT_OFFSET, PORT_BIT_LEN);
+    readCounts(status,
+               {ASYNC_INPUT_COUNT_BIT_OFFSET, SYNC_INPUT_COUNT_BIT_OFFSET,
+                ASYNC_OUTPUT_COUNT_BIT_OFFSET, SYNC_OUTPUT_COUNT_BIT_OFFSET, PORT_BIT_LEN},
+               result);
   }
 }
 
