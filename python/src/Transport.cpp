@@ -1,0 +1,62 @@
+// Turns the `target` argument of Session into a transport.
+#include "Transport.h"
+
+#include "ZinSim/Description.h"
+
+namespace py = pybind11;
+
+namespace zinmox {
+
+namespace {
+
+TransportChoice simulated(std::shared_ptr<ZinSim::Target> target, std::string description) {
+  TransportChoice choice;
+  choice.transport = target;
+  choice.simulated = std::move(target);
+  choice.description = std::move(description);
+  return choice;
+}
+
+TransportChoice fromDescription(const ZinSim::TargetDescription& description, std::string what) {
+  try {
+    return simulated(std::make_shared<ZinSim::Target>(description), std::move(what));
+  } catch (const ZinSim::DescriptionError& error) {
+    throw py::value_error(error.what());
+  }
+}
+
+TransportChoice fromPath(const std::string& path) {
+  if (path.rfind("tcp://", 0) == 0) {
+    throw py::value_error("network targets (" + path + ") are not supported by this build");
+  }
+  try {
+    return fromDescription(ZinSim::loadDescription(path), "description file " + path);
+  } catch (const ZinSim::DescriptionError& error) {
+    throw py::value_error(error.what());
+  }
+}
+
+TransportChoice fromDict(const py::dict& target) {
+  const std::string json = py::str(py::module_::import("json").attr("dumps")(target));
+  try {
+    return fromDescription(ZinSim::parseDescription(json), "description dict");
+  } catch (const ZinSim::DescriptionError& error) {
+    throw py::value_error(error.what());
+  }
+}
+
+}  // namespace
+
+TransportChoice makeTransport(const py::object& target) {
+  if (target.is_none()) return simulated(std::make_shared<ZinSim::Target>(), "demo design");
+  if (py::isinstance<py::dict>(target)) return fromDict(target);
+  const py::object pathLike = py::module_::import("os").attr("PathLike");
+  if (py::isinstance<py::str>(target) || py::isinstance(target, pathLike)) {
+    const py::object path = py::module_::import("os").attr("fsdecode")(target);
+    return fromPath(path.cast<std::string>());
+  }
+  throw py::type_error("target must be None, a description file path or a description dict, not " +
+                       std::string(py::str(target.get_type().attr("__name__"))));
+}
+
+}  // namespace zinmox
