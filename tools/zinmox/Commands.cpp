@@ -1,0 +1,43 @@
+// The application and the list of subcommands.
+#include "Commands.h"
+
+namespace zinmox {
+
+namespace {
+
+using Registration = void (*)(CLI::App&, Session&);
+
+// Every subcommand, in the order --help lists them. A new subcommand is one file and one line.
+const Registration kSubcommands[] = {
+    addScanCommand, addInfoCommand,  addDefineCommand, addUndefineCommand, addWriteCommand,
+    addReadCommand, addWatchCommand, addPortsCommand,  addRunCommand,      addDemoCommand,
+};
+
+}  // namespace
+
+void registerSubcommands(CLI::App& app, Session& session) {
+  for (Registration add : kSubcommands) add(app, session);
+}
+
+std::unique_ptr<CLI::App> buildApp(Session& session, bool forScript) {
+  auto app = std::make_unique<CLI::App>(
+      "zinmox: scan, describe, drive and watch the MOX cores of a target.\n"
+      "Cores are named DEVICE:CHAIN:CORE (decimal or 0x hex), for example 0:1:0.",
+      "zinmox");
+  app->require_subcommand(1);
+  app->fallthrough();
+  app->footer(
+      "Exit status: 0 success, 1 the session or a file reported a failure, 2 usage error.\n"
+      "Run 'zinmox SUBCOMMAND --help' for the options of a subcommand; 'zinmox demo' for a tour.");
+  if (!forScript) {
+    app->add_option_function<std::string>(
+           "--target", [&session](const std::string& spec) { session.setTargetSpec(spec); },
+           "JSON description of a simulated target (default: the built-in demo design)")
+        ->type_name("FILE");
+    app->set_version_flag("--version", std::string("zinmox ") + ZINMOX_TOOL_VERSION);
+  }
+  registerSubcommands(*app, session);
+  return app;
+}
+
+}  // namespace zinmox

@@ -1,0 +1,35 @@
+// The twelve fields of a MOX core's information, by the keys that ZinMOX_getCoreInfo writes.
+#ifndef ZINMOX_TOOL_COREINFOFIELDS_H
+#define ZINMOX_TOOL_COREINFOFIELDS_H
+
+#include <array>
+#include <cstdint>
+
+#include "ZinMOX/ZinMOX_CoreInfo.h"
+
+namespace zinmox {
+
+struct CoreInfoField {
+  const char* key;
+  uint32_t ZINMOX_CORE_INFO::*member;
+};
+
+/// In the record's field order.
+inline constexpr std::array<CoreInfoField, 12> kCoreInfoFields{{
+    {"manufacturer_id", &ZINMOX_CORE_INFO::manufacturer_id},
+    {"core_type", &ZINMOX_CORE_INFO::core_type},
+    {"core_major_version", &ZINMOX_CORE_INFO::core_major_version},
+    {"core_minor_version", &ZINMOX_CORE_INFO::core_minor_version},
+    {"core_revision", &ZINMOX_CORE_INFO::core_revision},
+    {"qx_major_version", &ZINMOX_CORE_INFO::qx_major_version},
+    {"qx_minor_version", &ZINMOX_CORE_INFO::qx_minor_version},
+    {"qx_minor_version_alpha", &ZINMOX_CORE_INFO::qx_minor_version_alpha},
+    {"async_input_count", &ZINMOX_CORE_INFO::async_input_count},
+    {"sync_input_count", &ZINMOX_CORE_INFO::sync_input_count},
+    {"async_output_count", &ZINMOX_CORE_INFO::async_output_count},
+    {"sync_output_count", &ZINMOX_CORE_INFO::sync_output_count},
+}};
+
+}  // namespace zinmox
+
+#endif

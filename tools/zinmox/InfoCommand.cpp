@@ -1,0 +1,53 @@
+// zinmox info REF: the twelve fields of a MOX core's information.
+#include <iostream>
+#include <nlohmann/json.hpp>
+
+#include "Commands.h"
+#include "CoreArgs.h"
+#include "CoreInfoFields.h"
+#include "CoreRef.h"
+#include "Table.h"
+#include "ZinMOX/ZinMOX.h"
+
+namespace zinmox {
+
+namespace {
+
+struct InfoArgs {
+  CoreArgs core;
+  bool json = false;
+};
+
+void showInfo(Session& session, const InfoArgs& args) {
+  ZIN_CORE_REF ref = parseCoreRef(args.core.ref);
+  ZinRT::ZinMOX_ValueMap values;
+  uintptr_t word = reinterpret_cast<uintptr_t>(&values);
+  session.check(ZinMOX_getCoreInfo(session.handle(), &ref, &word),
+                "reading the information of core " + args.core.ref);
+  if (args.json) {
+    nlohmann::json object{{"core", formatCoreRef(ref)}};
+    for (const CoreInfoField& field : kCoreInfoFields) {
+      object[field.key] = std::stoul(values.at(field.key));
+    }
+    std::cout << object.dump(2) << "\n";
+    return;
+  }
+  Table table({"field", "value"});
+  for (const CoreInfoField& field : kCoreInfoFields) {
+    table.addRow({field.key, values.at(field.key)});
+  }
+  table.print(std::cout);
+}
+
+}  // namespace
+
+void addInfoCommand(CLI::App& app, Session& session) {
+  auto args = std::make_shared<InfoArgs>();
+  CLI::App* command =
+      app.add_subcommand("info", "Show the twelve information fields of a MOX core");
+  addRefArgument(*command, args->core);
+  command->add_flag("--json", args->json, "machine-readable output");
+  command->callback([&session, args] { showInfo(session, *args); });
+}
+
+}  // namespace zinmox

@@ -1,0 +1,73 @@
+// One JTAG session of the tool on its target, with the cores it has initialised and the signals
+// it has defined. A plain invocation uses one Session; `run` keeps one for all its lines.
+#ifndef ZINMOX_TOOL_SESSION_H
+#define ZINMOX_TOOL_SESSION_H
+
+#include <cstdint>
+#include <map>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "Signals.h"
+#include "ZinRT/ZinCore_Types.h"
+#include "ZinRT/Zin_Transport.h"
+
+namespace zinmox {
+
+class Session {
+ public:
+  /// `targetSpec` as openTarget takes it; nothing is opened until the first use.
+  explicit Session(std::string targetSpec = "");
+  ~Session();
+  Session(const Session&) = delete;
+  Session& operator=(const Session&) = delete;
+
+  /// Where the target comes from; may change only before the session is opened.
+  void setTargetSpec(const std::string& spec);
+  const std::string& targetSpec() const { return targetSpec_; }
+
+  /// The session handle; opens the target and the session on first use.
+  uint32_t handle();
+  /// The cores where a status read answers, in reference order.
+  std::vector<ZIN_CORE_REF> listCores();
+
+  /// Turns the return code of an exported call into a Failure; the session's messages have
+  /// already been printed by then (`what` is printed only if none were).
+  void check(uint32_t returnCode, const std::string& what);
+
+  /// Makes sure the core at `ref` is initialised in this session (once per reference).
+  void useCore(const ZIN_CORE_REF& ref);
+  /// Defines a signal on an initialised core. An identical definition made before is kept; a
+  /// different one of the same name and direction is replaced.
+  void defineSignal(const ZIN_CORE_REF& ref, const SignalDefinition& signal);
+  /// Removes a name that was defined on the core.
+  void undefineSignal(const ZIN_CORE_REF& ref, const std::string& name, Port port);
+  /// Reads a signals file and defines its signals on the core.
+  void loadSignals(const ZIN_CORE_REF& ref, const std::string& path);
+
+  /// Whether the current command runs as a line of a script (run, demo).
+  bool inScript() const { return inScript_; }
+  void setInScript(bool inScript) { inScript_ = inScript; }
+
+ private:
+  static void onMessage(void* user, uint32_t handle, uint32_t code, const char* text);
+
+  struct Definition {
+    Port port;
+    std::vector<uint32_t> bits;
+  };
+  using DefinitionKey = std::pair<bool, std::string>;  // (input?, lower-case name)
+
+  std::string targetSpec_;
+  std::shared_ptr<ZinRT::Zin_Transport> transport_;
+  uint32_t handle_ = 0;
+  uint64_t messageCount_ = 0;
+  uint64_t checkedCount_ = 0;  // messageCount_ at the last check
+  bool inScript_ = false;
+  std::map<uint32_t, std::map<DefinitionKey, Definition>> cores_;  // by packed reference
+};
+
+}  // namespace zinmox
+
+#endif

@@ -1,0 +1,22 @@
+// The one place where a target specification becomes a transport.
+#ifndef ZINMOX_TOOL_TARGETOPEN_H
+#define ZINMOX_TOOL_TARGETOPEN_H
+
+#include <memory>
+#include <string>
+
+#include "ZinRT/Zin_Transport.h"
+
+namespace zinmox {
+
+/// Opens the target that `spec` names: "" is the built-in simulated demo design, anything else
+/// the path of a JSON target description (docs/target.md). Throws Failure with a readable text
+/// when the target cannot be opened.
+std::shared_ptr<ZinRT::Zin_Transport> openTarget(const std::string& spec);
+
+/// How the target of `spec` is named in output: "the built-in demo design" or the file name.
+std::string describeTarget(const std::string& spec);
+
+}  // namespace zinmox
+
+#endif
