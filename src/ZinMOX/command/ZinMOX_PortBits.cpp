@@ -20,15 +20,6 @@ void packInto(uint8_t* destination, const std::string& bits) {
   if (destination != nullptr) Zin_NumberUtil::reverseBinStr2Bin(bits, destination);
 }
 
-// Character i of entry b is bit i of byte b.
-constexpr std::array<std::array<char, 8>, 256> BIT_CHARS = [] {
-  std::array<std::array<char, 8>, 256> table{};
-  for (unsigned b = 0; b < 256; ++b) {
-    for (unsigned i = 0; i < 8; ++i) table[b][i] = ((b >> i) & 1u) != 0 ? '1' : '0';
-  }
-  return table;
-}();
-
 // The step strings of the (up to eight) outputs of one byte column, made from the column's bytes
 // of the sixteen step vectors: character t of output b's string becomes bit b of step t's byte.
 struct ColumnSteps {
@@ -44,7 +35,7 @@ void transposeColumn(uint64_t early, uint64_t late, ColumnSteps& out) {
   __m128i bytes = _mm_set_epi64x(static_cast<int64_t>(late), static_cast<int64_t>(early));
   for (int b = 7; b >= 0; --b) {
     const auto mask = static_cast<uint64_t>(_mm_movemask_epi8(bytes));  // bit t: step t
-    // Byte t of the spread mask holds mask bits t mod 8 to ..; the selector keeps bit t mod 8.
+    // Every byte of each half holds that half's eight step bits; byte t keeps only step t's.
     const __m128i spread =
         _mm_set_epi64x(static_cast<int64_t>((mask >> 8) * 0x0101010101010101ull),
                        static_cast<int64_t>((mask & 0xFF) * 0x0101010101010101ull));
@@ -55,6 +46,15 @@ void transposeColumn(uint64_t early, uint64_t late, ColumnSteps& out) {
   }
 }
 #else
+// Character i of entry b is bit i of byte b.
+constexpr std::array<std::array<char, 8>, 256> BIT_CHARS = [] {
+  std::array<std::array<char, 8>, 256> table{};
+  for (unsigned b = 0; b < 256; ++b) {
+    for (unsigned i = 0; i < 8; ++i) table[b][i] = ((b >> i) & 1u) != 0 ? '1' : '0';
+  }
+  return table;
+}();
+
 // Bit b of each of the eight bytes of `word` (byte t holds step t) as one byte, bit t for step t.
 inline unsigned stepBits(uint64_t word, uint32_t b) {
   return static_cast<unsigned>((((word >> b) & 0x0101010101010101ull) * 0x0102040810204080ull) >>
