@@ -1,6 +1,8 @@
 // The application and the list of subcommands.
 #include "Commands.h"
 
+#include "Errors.h"
+
 namespace zinmox {
 
 namespace {
@@ -24,7 +26,7 @@ std::unique_ptr<CLI::App> buildApp(Session& session, bool forScript) {
       "zinmox: scan, describe, drive and watch the MOX cores of a target.\n"
       "Cores are named DEVICE:CHAIN:CORE (decimal or 0x hex), for example 0:1:0.",
       "zinmox");
-  app->require_subcommand(1);
+  app->require_subcommand(0, 1);
   app->fallthrough();
   app->footer(
       "Exit status: 0 success, 1 the session or a file reported a failure, 2 usage error.\n"
@@ -37,6 +39,12 @@ std::unique_ptr<CLI::App> buildApp(Session& session, bool forScript) {
     app->set_version_flag("--version", std::string("zinmox ") + ZINMOX_TOOL_VERSION);
   }
   registerSubcommands(*app, session);
+  CLI::App* top = app.get();
+  app->callback([top] {
+    if (top->get_subcommands().empty()) {
+      throw UsageError("no subcommand given; 'zinmox demo' shows a short tour");
+    }
+  });
   return app;
 }
 

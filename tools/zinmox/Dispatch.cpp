@@ -40,6 +40,11 @@ int execute(CLI::App& app, const std::function<void()>& parse) {
     parse();
     std::cout.flush();
     return 0;
+  } catch (const CLI::ExtrasError& error) {
+    if (app.get_subcommands().empty() && !app.remaining().empty()) {
+      return usageError(app, "unknown subcommand '" + app.remaining().front() + "'");
+    }
+    return usageError(app, error.what());
   } catch (const CLI::ParseError& error) {
     if (error.get_exit_code() == 0) return app.exit(error);
     return usageError(app, error.what());

@@ -137,7 +137,12 @@ void addPortsCommand(CLI::App& app, Session& session) {
   auto args = std::make_shared<PortsArgs>();
   CLI::App* ports = app.add_subcommand("ports", "Read or write whole ports as hex vectors");
   addRefArgument(*ports, args->core);
-  ports->require_subcommand(1);
+  ports->require_subcommand(0, 1);
+  ports->callback([ports] {
+    if (ports->get_subcommands().empty()) {
+      throw UsageError("give read or write after the core reference: zinmox ports REF read");
+    }
+  });
   ports->footer(
       "Examples: zinmox ports 0:1:0 read\n"
       "          zinmox ports 0:1:0 write --async 00A5 --sync-mask 01 --sync 01");

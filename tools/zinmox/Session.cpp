@@ -120,7 +120,12 @@ void Session::defineSignal(const ZIN_CORE_REF& ref, const SignalDefinition& sign
           ? ZinMOX_defineSignal(handle(), &copy, signal.name.c_str(), type, signal.bits[0])
           : ZinMOX_defineBus(handle(), &copy, signal.name.c_str(), type, signal.bits.data(),
                              static_cast<uint32_t>(signal.bits.size()));
-  check(rc, "defining " + signal.name);
+  try {
+    check(rc, "defining " + signal.name);
+  } catch (const Failure&) {
+    throw Failure("could not define " + signal.name + " as " + portName(signal.port) + " bits " +
+                  formatBitList(signal.bits) + " on core " + formatCoreRef(ref));
+  }
   defined[key] = Definition{signal.port, signal.bits};
 }
 
