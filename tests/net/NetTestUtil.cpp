@@ -1,0 +1,136 @@
+// Raw frames, the test server and the raw client.
+#include "NetTestUtil.h"
+
+#include <thread>
+
+namespace ZinNetTest {
+
+Bytes u32(uint32_t value) {
+  return {static_cast<unsigned char>(value >> 24), static_cast<unsigned char>(value >> 16),
+          static_cast<unsigned char>(value >> 8), static_cast<unsigned char>(value)};
+}
+
+Bytes concat(std::initializer_list<Bytes> parts) {
+  Bytes out;
+  for (const Bytes& part : parts) out.insert(out.end(), part.begin(), part.end());
+  return out;
+}
+
+Bytes text(const std::string& s) {
+  return Bytes(s.begin(), s.end());
+}
+
+Bytes frame(uint8_t type, const Bytes& body) {
+  return concat({u32(static_cast<uint32_t>(body.size() + 1)), Bytes{type}, body});
+}
+
+Bytes hello(uint16_t version) {
+  return frame(0x01, concat({text("ZNET"), Bytes{static_cast<unsigned char>(version >> 8),
+                                                 static_cast<unsigned char>(version)}}));
+}
+
+TestServer::TestServer(std::shared_ptr<ZinRT::Zin_Transport> transport,
+                       ZinNet::ServerOptions options) {
+  options.host = "127.0.0.1";
+  options.port = 0;
+  options.log = [log = log_](const std::string& line) {
+    std::lock_guard<std::mutex> lock(log->mutex);
+    log->lines.push_back(line);
+  };
+  server_ = std::make_unique<ZinNet::Server>(std::move(transport), std::move(options));
+  server_->start();
+}
+
+TestServer::~TestServer() {
+  server_->stop();
+}
+
+std::vector<std::string> TestServer::log() const {
+  std::lock_guard<std::mutex> lock(log_->mutex);
+  return log_->lines;
+}
+
+bool TestServer::waitUntilNoConnections(std::chrono::milliseconds limit) {
+  const auto end = std::chrono::steady_clock::now() + limit;
+  while (server_->stats().connectionsOpen != 0) {
+    if (std::chrono::steady_clock::now() > end) return false;
+    std::this_thread::sleep_for(std::chrono::milliseconds(5));
+  }
+  return true;
+}
+
+RawClient::RawClient(uint16_t port) {
+  socket_.connect({asio::ip::make_address("127.0.0.1"), port});
+}
+
+void RawClient::send(const Bytes& bytes) {
+  std::error_code ec;  // the server may already have closed: that is for the reads to show
+  asio::write(socket_, asio::buffer(bytes), ec);
+}
+
+void RawClient::shutdownSend() {
+  std::error_code ec;
+  socket_.shutdown(asio::ip::tcp::socket::shutdown_send, ec);
+}
+
+void RawClient::close() {
+  std::error_code ec;
+  socket_.close(ec);
+}
+
+bool RawClient::readExactly(unsigned char* data, size_t size,
+                            std::chrono::steady_clock::time_point end) {
+  if (ended_) return false;
+  bool done = false;
+  std::error_code result;
+  asio::async_read(socket_, asio::buffer(data, size), [&](std::error_code ec, size_t) {
+    done = true;
+    result = ec;
+  });
+  io_.restart();
+  io_.run_until(end);
+  if (!done) {
+    socket_.cancel();
+    io_.restart();
+    io_.run();
+    return false;
+  }
+  if (result) ended_ = true;
+  return !result;
+}
+
+std::optional<RawFrame> RawClient::readFrame(std::chrono::milliseconds limit) {
+  const auto end = std::chrono::steady_clock::now() + limit;
+  unsigned char prefix[4];
+  if (!readExactly(prefix, 4, end)) return std::nullopt;
+  const uint32_t length = (uint32_t{prefix[0]} << 24) | (uint32_t{prefix[1]} << 16) |
+                          (uint32_t{prefix[2]} << 8) | prefix[3];
+  if (length == 0 || length > (64u << 20)) {
+    ADD_FAILURE() << "server sent a frame length of " << length;
+    return std::nullopt;
+  }
+  Bytes body(length);
+  if (!readExactly(body.data(), length, end)) return std::nullopt;
+  RawFrame got;
+  got.type = body[0];
+  got.body.assign(body.begin() + 1, body.end());
+  return got;
+}
+
+bool RawClient::closedWithin(std::chrono::milliseconds limit) {
+  const auto end = std::chrono::steady_clock::now() + limit;
+  while (!ended_ && std::chrono::steady_clock::now() < end) {
+    unsigned char byte = 0;
+    readExactly(&byte, 1, end);
+  }
+  return ended_;
+}
+
+void RawClient::greet() {
+  send(hello());
+  const std::optional<RawFrame> welcome = readFrame();
+  ASSERT_TRUE(welcome.has_value());
+  ASSERT_EQ(welcome->type, 0x81);
+}
+
+}  // namespace ZinNetTest

@@ -1,0 +1,206 @@
+// Untrusted input: clients that vanish mid-frame, stall, send oversized or malformed frames, or
+// crowd the server. The server answers or closes, never crashes or hangs, and keeps serving.
+#include <gtest/gtest.h>
+
+#include <filesystem>
+#include <fstream>
+#include <random>
+#include <thread>
+
+#include "NetTestUtil.h"
+#include "ZinNet/TcpTransport.h"
+
+namespace {
+
+using namespace ZinNetTest;
+using std::chrono::milliseconds;
+
+constexpr uint8_t kReadStatus = 0x02;
+constexpr uint8_t kSequence = 0x03;
+constexpr uint8_t kReadData = 0x83;
+constexpr uint8_t kRefused = 0xE1;
+constexpr uint8_t kClosing = 0xE2;
+
+// The demo's full-layout core: a flush-free read of its inputs.
+const std::string kReadText = "00 1 0 03 1 00000098 0\n00 1 0 04 1 00000004 0";
+constexpr uint32_t kReadBits = 160;  // 19 bytes from the 03 line, 1 from the 04 line
+
+ZinNet::ServerOptions quickOptions() {
+  ZinNet::ServerOptions options;
+  options.frameTimeoutMs = 300;
+  options.writeTimeoutMs = 300;
+  options.maxFrameBytes = 1 << 16;
+  options.maxReadBytes = 1 << 10;
+  return options;
+}
+
+// A well-behaved client gets its answer: the server is still serving.
+void expectServing(TestServer& server) {
+  ZinNet::TcpTransport transport("127.0.0.1", server.port(), {1000, 2000});
+  std::vector<unsigned char> data(kReadBits / 8);
+  EXPECT_NO_THROW(transport.commandSequence(kReadText, data.data(), kReadBits));
+}
+
+TEST(Robustness, AClientKilledMidRequestLeavesTheServerServing) {
+  TestServer server(std::make_shared<ZinSim::Target>(), quickOptions());
+  const Bytes request = frame(kSequence, concat({u32(kReadBits), text(kReadText)}));
+  for (size_t cut : {size_t{2}, size_t{4}, size_t{9}, request.size() - 1}) {
+    RawClient client(server.port());
+    client.greet();
+    client.send(Bytes(request.begin(), request.begin() + static_cast<long>(cut)));
+    client.close();
+  }
+  {
+    // A client that sends a whole request and leaves before the answer.
+    RawClient client(server.port());
+    client.greet();
+    client.send(request);
+    client.close();
+  }
+  expectServing(server);
+  EXPECT_TRUE(server.waitUntilNoConnections(milliseconds(2000)));
+  EXPECT_GE(server.server().stats().framesRefused, 4u);
+}
+
+TEST(Robustness, AHalfSentFrameTimesOutWhileOthersAreServed) {
+  TestServer server(std::make_shared<ZinSim::Target>(), quickOptions());
+  RawClient stalled(server.port());
+  stalled.greet();
+  stalled.send({0, 0, 0, 40, kSequence, 0, 0});  // 7 of 44 bytes, then nothing
+  expectServing(server);
+  EXPECT_TRUE(stalled.closedWithin(milliseconds(3000)));
+  RawClient idle(server.port());  // no idle limit: a connection between frames stays open
+  idle.greet();
+  EXPECT_FALSE(idle.closedWithin(milliseconds(400)));
+  bool logged = false;
+  for (const std::string& line : server.log()) {
+    logged = logged || line.find("a frame not done within 300 ms") != std::string::npos;
+  }
+  EXPECT_TRUE(logged);
+}
+
+TEST(Robustness, BadFramesGetARefusalOrAClosingFrame) {
+  TestServer server(std::make_shared<ZinSim::Target>(), quickOptions());
+  {
+    RawClient client(server.port());
+    client.send(hello(2));
+    const auto reply = client.readFrame();
+    ASSERT_TRUE(reply.has_value());
+    EXPECT_EQ(reply->type, kClosing);
+    EXPECT_EQ(reply->text(), "protocol version 2 is not supported; this server speaks 1");
+    EXPECT_TRUE(client.closedWithin(milliseconds(2000)));
+  }
+  {
+    // Within a connection, a well-delimited bad request is refused and the connection stays.
+    RawClient client(server.port());
+    client.greet();
+    client.send(frame(kReadStatus, u32(1)));
+    auto reply = client.readFrame();
+    ASSERT_TRUE(reply.has_value());
+    EXPECT_EQ(reply->type, kRefused);
+    EXPECT_EQ(reply->text(), "status read body too short: 4 bytes");
+    client.send(frame(kSequence, concat({u32(0xFFFFFFFF), text(kReadText)})));
+    reply = client.readFrame();
+    ASSERT_TRUE(reply.has_value());
+    EXPECT_EQ(reply->type, kRefused);
+    EXPECT_EQ(reply->text(),
+              "command sequence asks for 536870912 bytes of read data (at most 1024)");
+    client.send(frame(0x7F));
+    reply = client.readFrame();
+    ASSERT_TRUE(reply.has_value());
+    EXPECT_EQ(reply->text(), "unknown request type 0x7F (unknown)");
+    client.send(frame(kSequence, concat({u32(kReadBits), text(kReadText)})));
+    reply = client.readFrame();
+    ASSERT_TRUE(reply.has_value());
+    EXPECT_EQ(reply->type, kReadData);
+    EXPECT_EQ(reply->body.size(), kReadBits / 8);
+    // An oversized length cannot be skipped: the connection is closed.
+    client.send(concat({u32(1u << 30), Bytes(64, 0xAB)}));
+    reply = client.readFrame();
+    ASSERT_TRUE(reply.has_value());
+    EXPECT_EQ(reply->type, kClosing);
+    EXPECT_EQ(reply->text(), "frame of 1073741824 bytes exceeds the limit of 65536 bytes");
+    EXPECT_TRUE(client.closedWithin(milliseconds(2000)));
+  }
+  expectServing(server);
+}
+
+TEST(Robustness, ABusyServerTurnsAwayClientsBeyondItsLimit) {
+  ZinNet::ServerOptions options = quickOptions();
+  options.maxClients = 2;
+  TestServer server(std::make_shared<ZinSim::Target>(), options);
+  RawClient first(server.port());
+  first.greet();
+  RawClient second(server.port());
+  second.greet();
+  ZinNet::TcpTransport third("127.0.0.1", server.port(), {1000, 1000});
+  try {
+    third.connect();
+    ADD_FAILURE() << "a third client was let in";
+  } catch (const ZinNet::NetError& e) {
+    EXPECT_NE(std::string(e.what()).find("refused the connection: the server is busy"),
+              std::string::npos)
+        << e.what();
+  }
+  first.close();
+  for (int i = 0; i < 200 && server.server().stats().connectionsOpen > 1; ++i) {
+    std::this_thread::sleep_for(milliseconds(10));
+  }
+  EXPECT_NO_THROW(third.connect());
+}
+
+// Sends `bytes`, stops sending, and reads until the server closes: every frame it sends on the
+// way must be well formed, and the end must come within the bound.
+void expectAnsweredAndClosed(TestServer& server, const Bytes& bytes, const std::string& name) {
+  RawClient client(server.port());
+  client.send(bytes);
+  client.shutdownSend();
+  const auto end = std::chrono::steady_clock::now() + milliseconds(3000);
+  while (std::chrono::steady_clock::now() < end) {
+    const auto reply = client.readFrame(milliseconds(3000));
+    if (!reply) break;
+    EXPECT_TRUE(reply->type >= 0x81) << name << ": frame type " << int(reply->type);
+  }
+  EXPECT_TRUE(client.closedWithin(milliseconds(100))) << name << ": the server did not close";
+}
+
+TEST(Robustness, TheFuzzCorpusNeverCrashesOrHangsTheServer) {
+  TestServer server(std::make_shared<ZinSim::Target>(), quickOptions());
+  std::vector<std::filesystem::path> files;
+  for (const auto& entry : std::filesystem::directory_iterator(ZIN_NET_CORPUS_DIR)) {
+    if (entry.path().extension() == ".bin") files.push_back(entry.path());
+  }
+  std::sort(files.begin(), files.end());
+  ASSERT_GE(files.size(), 10u);
+  std::vector<Bytes> corpus;
+  for (const auto& path : files) {
+    std::ifstream in(path, std::ios::binary);
+    corpus.emplace_back(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
+    expectAnsweredAndClosed(server, corpus.back(), path.filename().string());
+  }
+  // Mutations of the corpus: flipped, dropped and repeated bytes, seeded for repeatability.
+  std::mt19937 rng(20261206);
+  for (int round = 0; round < 60; ++round) {
+    Bytes bytes = corpus[rng() % corpus.size()];
+    const int edits = 1 + static_cast<int>(rng() % 4);
+    for (int e = 0; e < edits && !bytes.empty(); ++e) {
+      const size_t at = rng() % bytes.size();
+      switch (rng() % 3) {
+        case 0:
+          bytes[at] ^= static_cast<unsigned char>(1u << (rng() % 8));
+          break;
+        case 1:
+          bytes.erase(bytes.begin() + static_cast<long>(at));
+          break;
+        default:
+          bytes.insert(bytes.begin() + static_cast<long>(at), bytes[at]);
+          break;
+      }
+    }
+    expectAnsweredAndClosed(server, bytes, "mutation " + std::to_string(round));
+  }
+  expectServing(server);
+  EXPECT_TRUE(server.waitUntilNoConnections(milliseconds(3000)));
+}
+
+}  // namespace

@@ -1,0 +1,219 @@
+// Sessions of several clients on one served target, through the exported ZinMOX functions, and
+// the life of a client connection: connect errors, timeouts, loss and reconnection.
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <thread>
+
+#include "NetTestUtil.h"
+#include "ZinMOX/ZinMOX.h"
+#include "ZinNet/TcpTransport.h"
+#include "ZinNet/ZinNet.h"
+#include "ZinRT/ZinJtag.h"
+
+namespace {
+
+using ZinNetTest::TestServer;
+using ZinRT::ZinMOX_ValueMap;
+
+ZIN_CORE_REF kFull{0, 1, 0};  // the demo design's full-layout core, inputs looped back
+
+/// A session on a server, recording its messages.
+class Client {
+ public:
+  Client(uint16_t port, uint32_t timeoutMs = 2000) {
+    handle = ZinNet_openSession("127.0.0.1", port, timeoutMs);
+    EXPECT_NE(handle, 0u) << ZinNet_lastError();
+    if (handle != 0) ZinJtag_setMessageHandler(handle, &Client::onMessage, this);
+  }
+  ~Client() {
+    if (handle != 0) ZinJtag_closeSession(handle);
+  }
+  static void onMessage(void* user, uint32_t, uint32_t, const char* text) {
+    auto* self = static_cast<Client*>(user);
+    std::lock_guard<std::mutex> lock(self->mutex);
+    self->messages.push_back(text);
+  }
+  std::vector<std::string> takeMessages() {
+    std::lock_guard<std::mutex> lock(mutex);
+    return std::exchange(messages, {});
+  }
+  uint32_t write(const std::string& key, const std::string& value) {
+    ZinMOX_ValueMap values{{key, value}};
+    uintptr_t word = reinterpret_cast<uintptr_t>(&values);
+    return ZinMOX_writeValues(handle, &kFull, &word);
+  }
+  ZinMOX_ValueMap readAll() {
+    ZinMOX_ValueMap values;
+    uintptr_t word = reinterpret_cast<uintptr_t>(&values);
+    if (ZinMOX_readValues(handle, &kFull, &word) != ZINMOX_SUCCESS) return {};
+    return values;
+  }
+  std::string read(const std::string& key) { return readAll()[key]; }
+
+  uint32_t handle = 0;
+  std::mutex mutex;
+  std::vector<std::string> messages;
+};
+
+TEST(SharedTarget, TwoClientsSeeEachOthersWrites) {
+  auto target = std::make_shared<ZinSim::Target>();
+  TestServer server(target);
+  Client a(server.port());
+  Client b(server.port());
+  ASSERT_EQ(ZinMOX_initCore(a.handle, &kFull), ZINMOX_SUCCESS);
+  ASSERT_EQ(ZinMOX_initCore(b.handle, &kFull), ZINMOX_SUCCESS);
+
+  ASSERT_EQ(a.write("async_out_data", "A5C3"), ZINMOX_SUCCESS);
+  EXPECT_EQ(target->asyncOutputLevels(kFull), "1100001110100101");
+  EXPECT_EQ(b.read("async_in_data"), "A5C3");
+  ASSERT_EQ(b.write("async_out_data", "1234"), ZINMOX_SUCCESS);
+  ZinMOX_ValueMap in = a.readAll();
+  EXPECT_EQ(in["async_in_data"], "1234");
+  // The activity latches belong to the target too: b's read cleared them, b's write set them.
+  EXPECT_EQ(in["async_in_data.activity_up"], "1234");
+  EXPECT_EQ(in["async_in_data.activity_down"], "A5C3");
+  EXPECT_TRUE(a.takeMessages().empty());
+  EXPECT_TRUE(b.takeMessages().empty());
+
+  // The status read, the core list and the flushes went over the wire too.
+  EXPECT_EQ(target->flushCount(), 2u);
+  EXPECT_GE(server.server().stats().requestsServed, 8u);
+  EXPECT_EQ(server.server().stats().connectionsOpen, 2u);
+}
+
+TEST(SharedTarget, TargetFailuresArriveWithTheTargetsOwnText) {
+  auto target = std::make_shared<ZinSim::Target>();
+  TestServer server(target);
+  Client a(server.port());
+  ASSERT_EQ(ZinMOX_initCore(a.handle, &kFull), ZINMOX_SUCCESS);
+  target->failNextTransfer("ZinSim test: cable unplugged");
+  EXPECT_EQ(a.write("async_out_data", "FFFF"), ZINMOX_FAILURE);
+  EXPECT_EQ(a.takeMessages(), std::vector<std::string>{"ZinSim test: cable unplugged"});
+  // A target failure leaves the connection in use.
+  EXPECT_EQ(a.write("async_out_data", "0001"), ZINMOX_SUCCESS);
+  EXPECT_EQ(server.server().stats().connectionsAccepted, 1u);
+
+  auto transport = std::make_shared<ZinNet::TcpTransport>("127.0.0.1", server.port());
+  std::vector<ZIN_CORE_REF> refs;
+  ASSERT_TRUE(transport->listCores(refs));
+  EXPECT_EQ(refs.size(), target->description().cores.size());
+  EXPECT_THROW(transport->commandSequence("00 1 0 07 0 00000004 0", nullptr, 0),
+               ZinNet::TargetError);
+  EXPECT_EQ(transport->serverName(), "ZinNet target server");
+}
+
+TEST(SharedTarget, UnreachableServerFailsTheOpenWithAClearText) {
+  uint16_t port = 0;
+  {
+    TestServer gone(std::make_shared<ZinSim::Target>());
+    port = gone.port();
+  }
+  EXPECT_EQ(ZinNet_openSession("127.0.0.1", port, 500), 0u);
+  EXPECT_NE(std::string(ZinNet_lastError()).find("cannot connect to 127.0.0.1:"), std::string::npos)
+      << ZinNet_lastError();
+  EXPECT_EQ(ZinNet_openSession(nullptr, port, 500), 0u);
+  EXPECT_EQ(ZinNet_openSession("127.0.0.1", 0, 500), 0u);
+  EXPECT_STREQ(ZinNet_lastError(), "ZinNet_openSession: port 0");
+}
+
+TEST(SharedTarget, ALostConnectionFailsTheCallAndTheNextCallReconnects) {
+  auto target = std::make_shared<ZinSim::Target>();
+  auto first = std::make_unique<TestServer>(target);
+  const uint16_t port = first->port();
+  Client a(port);
+  ASSERT_EQ(ZinMOX_initCore(a.handle, &kFull), ZINMOX_SUCCESS);
+  ASSERT_EQ(a.write("async_out_data", "00FF"), ZINMOX_SUCCESS);
+
+  first.reset();  // the server goes away: the call in progress fails
+  EXPECT_EQ(a.write("async_out_data", "0F0F"), ZINMOX_FAILURE);
+  const std::vector<std::string> messages = a.takeMessages();
+  ASSERT_EQ(messages.size(), 1u);
+  EXPECT_NE(messages[0].find("ZinNet: cannot connect to 127.0.0.1:" + std::to_string(port)),
+            std::string::npos)
+      << messages[0];
+
+  ZinNet::ServerOptions options;
+  options.port = port;  // a server comes back on the same port
+  options.log = [](const std::string&) {};
+  ZinNet::Server second(target, options);
+  second.start();
+  EXPECT_EQ(a.write("async_out_data", "0F0F"), ZINMOX_SUCCESS);
+  EXPECT_EQ(a.read("async_in_data"), "0F0F");
+  EXPECT_TRUE(a.takeMessages().empty());
+}
+
+// A transport that takes its time with command sequences.
+class SlowTransport : public ZinRT::Zin_Transport {
+ public:
+  void readStatus(const ZIN_CORE_REF&, ZIN_CORE_INFO&, unsigned char*, uint32_t,
+                  uint32_t) override {}
+  void commandSequence(const std::string& text, unsigned char*, uint32_t) override {
+    if (text == "slow") std::this_thread::sleep_for(std::chrono::milliseconds(400));
+    ++done;
+  }
+  void flush() override {}
+  std::atomic<int> done{0};
+};
+
+TEST(SharedTarget, ARequestTimeoutClosesTheConnectionAndTheNextCallReconnects) {
+  auto slow = std::make_shared<SlowTransport>();
+  TestServer server(slow);
+  ZinNet::TcpTransport transport("127.0.0.1", server.port(), {1000, 100});
+  transport.connect();
+  try {
+    transport.commandSequence("slow", nullptr, 0);
+    ADD_FAILURE() << "no timeout";
+  } catch (const ZinNet::NetError& e) {
+    EXPECT_EQ(std::string(e.what()),
+              "ZinNet: waiting for the answer to a command sequence took longer than 100 ms; the "
+              "connection to 127.0.0.1:" +
+                  std::to_string(server.port()) + " was closed");
+  }
+  EXPECT_FALSE(transport.isConnected());
+  // The next call connects again; it runs once the slow one is done (one request at a time).
+  ZinNet::TcpTransport patient("127.0.0.1", server.port(), {1000, 2000});
+  patient.commandSequence("quick", nullptr, 0);
+  transport.commandSequence("quick", nullptr, 0);
+  EXPECT_TRUE(transport.isConnected());
+  EXPECT_EQ(slow->done, 3);
+  EXPECT_EQ(server.server().stats().connectionsAccepted, 3u);
+}
+
+TEST(SharedTarget, AServerGoingAwayFailsTheRequestInProgress) {
+  auto slow = std::make_shared<SlowTransport>();
+  auto server = std::make_unique<TestServer>(slow);
+  ZinNet::TcpTransport transport("127.0.0.1", server->port(), {1000, 5000});
+  transport.connect();
+  std::thread stopper([&] {
+    std::this_thread::sleep_for(std::chrono::milliseconds(100));
+    server->server().stop();
+  });
+  try {
+    transport.commandSequence("slow", nullptr, 0);
+    ADD_FAILURE() << "the call went through";
+  } catch (const ZinNet::NetError& e) {
+    EXPECT_NE(std::string(e.what()).find("lost while waiting for the answer to a command sequence"),
+              std::string::npos)
+        << e.what();
+  }
+  stopper.join();
+  EXPECT_FALSE(transport.isConnected());
+}
+
+TEST(SharedTarget, LimitsAreCheckedBeforeSending) {
+  ZinNet::ServerOptions options;
+  options.maxFrameBytes = 64;
+  options.maxReadBytes = 8;
+  TestServer server(std::make_shared<SlowTransport>(), options);
+  ZinNet::TcpTransport transport("127.0.0.1", server.port());
+  std::vector<unsigned char> data(9);
+  EXPECT_THROW(transport.commandSequence(std::string(60, 'x'), nullptr, 0), ZinNet::NetError);
+  EXPECT_THROW(transport.commandSequence("x", data.data(), 65), ZinNet::NetError);
+  transport.commandSequence("x", data.data(), 64);
+  EXPECT_TRUE(transport.isConnected());
+  std::vector<ZIN_CORE_REF> refs;
+  EXPECT_FALSE(transport.listCores(refs));  // the transport behind cannot list
+}
+
+}  // namespace
