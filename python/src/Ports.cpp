@@ -21,7 +21,9 @@ std::string packed(const py::object& data, size_t size, const std::string& what)
   if (py::isinstance<py::bytes>(data)) {
     bytes = data.cast<std::string>();
   } else if (py::isinstance<py::bytearray>(data) || py::isinstance<py::memoryview>(data)) {
-    bytes = py::bytes(data).cast<std::string>();
+    PyObject* copy = PyBytes_FromObject(data.ptr());
+    if (copy == nullptr) throw py::error_already_set();
+    bytes = py::reinterpret_steal<py::bytes>(copy).cast<std::string>();
   } else {
     throw py::type_error(what + " must be bytes, not " + typeName(data));
   }

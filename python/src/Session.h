@@ -45,7 +45,8 @@ class SessionState : public std::enable_shared_from_this<SessionState> {
   /// with the call's messages when it returns anything but 0, and logs them otherwise.
   void call(const std::string& function, const std::function<uint32_t(uint32_t)>& work);
 
-  /// Runs `work` with the GIL released and the session held open, collecting its messages.
+  /// Runs `work` with the GIL released and the session held open; returns the messages it
+  /// produced, for the caller to raise or log.
   Messages run(const std::function<void(uint32_t)>& work);
 
  private:

@@ -1,0 +1,83 @@
+"""Failures raise zinmox.Error with the session's messages of that call."""
+
+import pytest
+
+import zinmox
+from conftest import FULL
+
+
+def test_error_carries_the_messages_and_codes_of_the_call(session, core):
+    assert issubclass(zinmox.Error, RuntimeError)
+    with pytest.raises(zinmox.Error) as raised:
+        core.write({"nothing": "1"})
+    assert str(raised.value) == "Could not find a signal with the name: nothing"
+    assert raised.value.function == "ZinMOX_writeValues"
+    assert raised.value.messages == [(256, "Could not find a signal with the name: nothing")]
+    # Wrong core type: two messages, the second with the abort code.
+    with pytest.raises(zinmox.Error) as raised:
+        session.core("0:1:3").init()
+    assert raised.value.codes == [256, 32768]
+    assert raised.value.texts == [
+        "ZinMOX_initCore() for the wrong core type or non-existant core.",
+        "Zin abort command",
+    ]
+    assert str(raised.value) == "\n".join(raised.value.texts)
+    # The next call starts with no messages of its own.
+    core.define("ok", "async_out", 0)
+
+
+def test_library_checks_reach_python_with_their_text(session, core):
+    uninitialised = session.core((0, 1, 2))
+    with pytest.raises(zinmox.Error, match=r"^Data structures not initialized for MOX core "
+                       r"Device:0, user chain number:1, core index:2\.$"):
+        uninitialised.read()
+    core.define("fast", "async_out", 0)
+    with pytest.raises(zinmox.Error, match="^.pulsetrain cannot be used with the non-synchronous "
+                       "output: fast$"):
+        core.write(fast=[0] * 16)
+    # A short text is reported by its first character, a text of the full width whole.
+    core.define("wide", "async_out", list(range(1, 16)))
+    with pytest.raises(zinmox.Error, match="^Invalid Hex String: z$"):
+        core.write(wide="z5")
+    with pytest.raises(zinmox.Error, match="^Invalid Hex String: z5$"):
+        core.write(fast="z5")
+    with pytest.raises(zinmox.Error, match="is already used by another signal"):
+        core.define("fast", "async_out", 1)
+    with pytest.raises(zinmox.Error, match="^The name, slow, has not been defined"):
+        core.undefine("slow", "async_out")
+    with pytest.raises(zinmox.Error, match="arrayLen!=0"):
+        core.define("empty", "async_out", [])
+    with pytest.raises(zinmox.Error, match="index is greater than the number"):
+        core.define("far", "async_out", 16)
+    core.undefine("fast", "async_out")
+    with pytest.raises(zinmox.Error, match="Could not find a signal with the name: fast"):
+        core.write(fast=1)
+
+
+def test_failing_transfer_and_status_read(session, core):
+    core.define("ctl", "async_out", 0)
+    session.target.fail_next_transfer("cable unplugged")
+    with pytest.raises(zinmox.Error, match="^cable unplugged$"):
+        core.write(ctl=1)
+    assert session.target.levels(FULL, "async_out") == 0
+    session.target.fail_next_status_read("no answer")
+    with pytest.raises(zinmox.Error, match="no answer"):
+        core.info
+    core.write(ctl=1)
+    assert session.target.levels(FULL, "async_out") == 1
+
+
+def test_values_checked_before_any_call(core):
+    core.define("ctl", "async_out", [0, 1])
+    core.define("clk", "sync_out", [0])
+    with pytest.raises(ValueError, match="16 steps"):
+        core.write(clk=[0, 1])
+    with pytest.raises(ValueError, match="invalid hex text"):
+        core.write(clk=["1"] * 15 + ["x"])
+    with pytest.raises(ValueError, match="given twice"):
+        core.write({"clk": [0] * 16, "clk.pulsetrain": "0"})
+    with pytest.raises(ValueError, match="NUL"):
+        core.define("a\0b", "async_out", 1)
+    with pytest.raises(ValueError, match="unknown port"):
+        core.define("x", "async", 1)
+

@@ -1,0 +1,106 @@
+"""Sessions: targets, the context manager, scanning and core references."""
+
+import json
+import threading
+
+import pytest
+
+import zinmox
+
+SMALL = {
+    "devices": [{"index": 2, "chains": [{"number": 3, "cores": [
+        {"index": 1, "async_outputs": 4, "async_inputs": 4, "sync_outputs": 1, "sync_inputs": 1},
+        {"index": 2, "type": 5, "status": "12"},
+    ]}]}]
+}
+
+
+def test_context_manager_closes_the_session():
+    with zinmox.Session() as session:
+        core = session.core("0:1:1").init()
+        assert not session.closed and session.handle != 0
+    assert session.closed and session.handle == 0
+    with pytest.raises(zinmox.Error, match="^The session is closed.$"):
+        core.read()
+    with pytest.raises(zinmox.Error, match="closed"):
+        session.scan()
+    session.close()  # closing again does nothing
+    # An exception inside the block closes the session as well and is not swallowed.
+    with pytest.raises(KeyError):
+        with zinmox.Session() as failing:
+            raise KeyError("x")
+    assert failing.closed
+    # The simulated target outlives the session for inspection.
+    assert failing.target.flush_count == 0
+
+
+def test_scan_lists_the_demo_design():
+    with zinmox.Session() as session:
+        cores = session.scan()
+    assert [entry["ref"] for entry in cores] == [(0, 1, 0), (0, 1, 1), (0, 1, 2), (0, 1, 3)]
+    assert [entry["mox"] for entry in cores] == [True, True, True, False]
+    assert cores[3]["info"] is None
+    info = cores[0]["info"]
+    assert (info["core_major_version"], info["core_minor_version"]) == (10, 2)
+    assert (info["async_output_count"], info["sync_output_count"]) == (16, 8)
+
+
+def test_description_dict_and_file(tmp_path):
+    with zinmox.Session(SMALL) as session:
+        core = session.core((2, 3, 1)).init()
+        assert core.info["async_output_count"] == 4
+        assert core.info["core_type"] == 9 and len(core.info) == 12
+        assert [entry["mox"] for entry in session.scan()] == [True, False]
+    path = tmp_path / "board.json"
+    path.write_text(json.dumps(SMALL))
+    for target in (path, str(path)):
+        with zinmox.Session(target) as session:
+            assert session.core("0x2:3:0x1").init().ref == (2, 3, 1)
+            assert "board.json" in repr(session)
+    with pytest.raises(ValueError, match="/devices/0/chains/0/cores/0/async_outputs"):
+        broken = json.loads(json.dumps(SMALL))
+        broken["devices"][0]["chains"][0]["cores"][0]["async_outputs"] = 70000
+        zinmox.Session(broken)
+    with pytest.raises(ValueError, match="missing.json"):
+        zinmox.Session(str(tmp_path / "missing.json"))
+
+
+def test_core_references():
+    with zinmox.Session() as session:
+        assert session.core("0:1:0x2").ref == (0, 1, 2)
+        assert session.core([0, 1, 3]).ref == (0, 1, 3)
+        assert repr(session.core((0, 1, 0))) == "<zinmox.Core 0:1:0>"
+        for bad in ("0:1", "0:1:2:3", "a:b:c", "0:1:-1", "0:1:0x", "0:1:4294967296"):
+            with pytest.raises(ValueError):
+                session.core(bad)
+        with pytest.raises(ValueError):
+            session.core((0, 1, -1))
+        with pytest.raises(ValueError):
+            session.core((0, 1))
+
+
+def test_calls_from_several_threads():
+    # Calls release the GIL; each thread works on its own core and sees its own values (core 2
+    # has a square wave on async input 3, so only its bits 0 to 2 loop back).
+    with zinmox.Session() as session:
+        failures = []
+
+        def work(ref, width):
+            try:
+                core = session.core(ref).init()
+                core.define("out", "async_out", list(range(width)))
+                core.define("back", "async_in", list(range(width)))
+                for value in range(200):
+                    core.write(out=value % (1 << width))
+                    if core.read()["back"].value != value % (1 << width):
+                        failures.append((ref, value))
+            except Exception as error:  # reported below
+                failures.append(error)
+
+        threads = [threading.Thread(target=work, args=(ref, width))
+                   for ref, width in (("0:1:0", 16), ("0:1:1", 8), ("0:1:2", 3))]
+        for thread in threads:
+            thread.start()
+        for thread in threads:
+            thread.join()
+        assert failures == []
