@@ -64,12 +64,15 @@ void checkTransfer(FuzzSession& session) {
   }
 }
 
-// The staged image of a signal written alone with a plain value.
+// The staged image of a signal written alone with a plain value. A bus may name a port bit more
+// than once; the last value bit staged on it is the one it holds.
 void checkStaged(const ZinRT::ZinMOX_Command& image, const Defined& signal,
                  const std::vector<int>& bits) {
+  std::map<uint32_t, char> expected;
   for (size_t i = 0; i < signal.positions.size(); ++i) {
-    const char want = bits[i] != 0 ? '1' : '0';
-    const uint32_t p = signal.positions[i];
+    expected[signal.positions[i]] = bits[i] != 0 ? '1' : '0';
+  }
+  for (const auto& [p, want] : expected) {
     if (signal.type == ZINMOX_ASYNC_OUTPUT) {
       if (image.getAsyncOutValueBits()[p] != want || image.getAsyncOutUpdateBits()[p] != '1') {
         fail("asynchronous output bit " + std::to_string(p) + " staged wrong");
