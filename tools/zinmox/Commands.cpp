@@ -11,8 +11,9 @@ using Registration = void (*)(CLI::App&, Session&);
 
 // Every subcommand, in the order --help lists them. A new subcommand is one file and one line.
 const Registration kSubcommands[] = {
-    addScanCommand, addInfoCommand,  addDefineCommand, addUndefineCommand, addWriteCommand,
-    addReadCommand, addWatchCommand, addPortsCommand,  addRunCommand,      addDemoCommand,
+    addScanCommand,  addInfoCommand, addDefineCommand, addUndefineCommand,
+    addWriteCommand, addReadCommand, addWatchCommand,  addPortsCommand,
+    addRunCommand,   addDemoCommand, addServeCommand,
 };
 
 }  // namespace
@@ -34,7 +35,8 @@ std::unique_ptr<CLI::App> buildApp(Session& session, bool forScript) {
   if (!forScript) {
     app->add_option_function<std::string>(
            "--target", [&session](const std::string& spec) { session.setTargetSpec(spec); },
-           "JSON description of a simulated target (default: the built-in demo design)")
+           "JSON description of a simulated target, or tcp://HOST:PORT of a target server "
+           "(default: the built-in demo design)")
         ->type_name("FILE");
     app->set_version_flag("--version", std::string("zinmox ") + ZINMOX_TOOL_VERSION);
   }

@@ -27,6 +27,7 @@ void addWatchCommand(CLI::App& app, Session& session);
 void addPortsCommand(CLI::App& app, Session& session);
 void addRunCommand(CLI::App& app, Session& session);
 void addDemoCommand(CLI::App& app, Session& session);
+void addServeCommand(CLI::App& app, Session& session);
 
 }  // namespace zinmox
 

@@ -1,14 +1,40 @@
 // Opening the target of a --target option.
 #include "TargetOpen.h"
 
+#include <optional>
+
 #include "Errors.h"
+#include "ZinNet/Endpoint.h"
+#include "ZinNet/TcpTransport.h"
 #include "ZinSim/Description.h"
 #include "ZinSim/Target.h"
 
 namespace zinmox {
 
+namespace {
+
+// The server of a "tcp://HOST:PORT" target, or nothing for a description file.
+std::optional<ZinNet::Endpoint> tcpEndpoint(const std::string& spec) {
+  try {
+    return ZinNet::parseTcpTarget(spec);
+  } catch (const std::invalid_argument& error) {
+    throw UsageError(error.what());
+  }
+}
+
+}  // namespace
+
 std::shared_ptr<ZinRT::Zin_Transport> openTarget(const std::string& spec) {
   if (spec.empty()) return std::make_shared<ZinSim::Target>();
+  if (const std::optional<ZinNet::Endpoint> server = tcpEndpoint(spec)) {
+    auto transport = std::make_shared<ZinNet::TcpTransport>(*server);
+    try {
+      transport->connect();  // report a missing server before any work starts
+    } catch (const ZinNet::NetError& error) {
+      throw Failure(error.what());
+    }
+    return transport;
+  }
   try {
     return std::make_shared<ZinSim::Target>(ZinSim::loadDescription(spec));
   } catch (const ZinSim::DescriptionError& error) {
@@ -17,7 +43,11 @@ std::shared_ptr<ZinRT::Zin_Transport> openTarget(const std::string& spec) {
 }
 
 std::string describeTarget(const std::string& spec) {
-  return spec.empty() ? "the built-in demo design" : spec;
+  if (spec.empty()) return "the built-in demo design";
+  if (const std::optional<ZinNet::Endpoint> server = tcpEndpoint(spec)) {
+    return "the target server at " + server->text();
+  }
+  return spec;
 }
 
 }  // namespace zinmox

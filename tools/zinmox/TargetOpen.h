@@ -9,8 +9,9 @@
 
 namespace zinmox {
 
-/// Opens the target that `spec` names: "" is the built-in simulated demo design, anything else
-/// the path of a JSON target description (docs/target.md). Throws Failure with a readable text
+/// Opens the target that `spec` names: "" is the built-in simulated demo design, "tcp://HOST:PORT"
+/// a target server (connected at once), anything else the path of a JSON target description
+/// (docs/target.md). Throws Failure with a readable text
 /// when the target cannot be opened.
 std::shared_ptr<ZinRT::Zin_Transport> openTarget(const std::string& spec);
 

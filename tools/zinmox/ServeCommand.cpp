@@ -1,0 +1,62 @@
+// zinmox serve: holds a target and serves it to other processes over TCP.
+#include <iostream>
+
+#include "Commands.h"
+#include "Errors.h"
+#include "TargetOpen.h"
+#include "ZinNet/Endpoint.h"
+#include "ZinNet/Server.h"
+
+namespace zinmox {
+
+namespace {
+
+constexpr const char* kDefaultListen = "127.0.0.1:7700";
+
+void serve(Session& session, const std::string& listen) {
+  if (session.inScript()) throw UsageError("serve cannot run as a line of a script");
+  ZinNet::Endpoint endpoint;
+  try {
+    endpoint = ZinNet::parseEndpoint(listen, true);
+  } catch (const std::invalid_argument& error) {
+    throw UsageError(error.what());
+  }
+  ZinNet::ServerOptions options;
+  options.host = endpoint.host;
+  options.port = endpoint.port;
+  options.name = "zinmox serve: " + describeTarget(session.targetSpec());
+  options.stopOnSignals = true;
+  options.log = [](const std::string& line) {
+    std::cout << "zinmox serve: " << line << std::endl;  // one flushed line per event
+  };
+  ZinNet::Server server(openTarget(session.targetSpec()), options);
+  try {
+    server.start();
+  } catch (const std::runtime_error& error) {
+    throw Failure(error.what());
+  }
+  std::cout << "zinmox serve: serving " << describeTarget(session.targetSpec())
+            << "; connect with --target tcp://" << server.address() << "; Ctrl-C or SIGTERM stops"
+            << std::endl;
+  server.wait();
+  server.stop();
+}
+
+}  // namespace
+
+void addServeCommand(CLI::App& app, Session& session) {
+  auto* command = app.add_subcommand(
+      "serve",
+      "Hold the target and serve it to other processes over TCP, so that their writes and reads "
+      "meet on one target (clients use --target tcp://HOST:PORT)");
+  auto listen = std::make_shared<std::string>(kDefaultListen);
+  command
+      ->add_option("--listen", *listen,
+                   "Address and port to listen on; port 0 takes a free one. Other machines "
+                   "can connect only if HOST is not a loopback address")
+      ->type_name("HOST:PORT")
+      ->capture_default_str();
+  command->callback([&session, listen] { serve(session, *listen); });
+}
+
+}  // namespace zinmox
