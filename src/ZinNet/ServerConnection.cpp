@@ -74,16 +74,17 @@ void ServerConnection::disarmTimer() {
 
 void ServerConnection::onReadError(std::error_code ec, const char* where) {
   if (closed_) return;
-  if (ec == asio::error::eof && std::strcmp(where, "between frames") == 0) {
+  const bool ended = ec == asio::error::eof || ec == asio::error::connection_reset;
+  if (ended && std::strcmp(where, "between frames") == 0) {
     close("the client closed the connection");
     return;
   }
-  if (ec != asio::error::eof && ec != asio::error::connection_reset) {
+  ++core_->framesRefused;  // a truncated frame
+  if (ended) {
+    close(std::string("the client closed the connection ") + where);
+  } else {
     close(std::string("read failed ") + where + ": " + ec.message());
-    return;
   }
-  ++core_->framesRefused;
-  close(std::string("the client closed the connection ") + where);
 }
 
 void ServerConnection::readPrefix() {
