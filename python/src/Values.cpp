@@ -43,12 +43,15 @@ Entry makeEntry(const py::handle& key, const py::handle& value) {
     throw py::type_error("signal names must be str, not " + typeName(key));
   }
   Entry entry{
-      key.cast<std::string>(), {}, {}, py::reinterpret_borrow<py::object>(value), Kind::Text};
+      toCText(key, "a signal name"), {}, {}, py::reinterpret_borrow<py::object>(value), Kind::Text};
   const size_t dot = entry.key.find('.');
   entry.name = entry.key.substr(0, dot);
   entry.suffix = dot == std::string::npos ? std::string() : entry.key.substr(dot + 1);
-  if (py::isinstance<py::str>(value)) return entry;
-  if (py::isinstance<py::int_>(value) && !py::isinstance<py::bool_>(value)) {
+  if (py::isinstance<py::str>(value)) {
+    toCText(value, "the value of \"" + entry.key + "\"");  // the library reads it up to a NUL
+    return entry;
+  }
+  if (py::isinstance<py::int_>(value)) {  // True and False write 1 and 0
     entry.kind = Kind::Number;
   } else if (py::isinstance<py::list>(value) || py::isinstance<py::tuple>(value)) {
     entry.kind = Kind::Steps;
@@ -107,7 +110,7 @@ std::string stepBytes(const py::handle& step, const Width& width, const std::str
       throw py::value_error(std::string(error.what()) + " (a step of \"" + key + "\")");
     }
   }
-  if (!py::isinstance<py::int_>(step) || py::isinstance<py::bool_>(step)) {
+  if (!py::isinstance<py::int_>(step)) {
     throw py::type_error("the steps of \"" + key + "\" must be ints or hex str, not " +
                          typeName(step));
   }

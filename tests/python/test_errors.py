@@ -78,6 +78,8 @@ def test_values_checked_before_any_call(core):
         core.write({"clk": [0] * 16, "clk.pulsetrain": "0"})
     with pytest.raises(ValueError, match="NUL"):
         core.define("a\0b", "async_out", 1)
+    with pytest.raises(ValueError, match="NUL"):
+        core.write(ctl="3\0ff")  # the library would stop reading at the NUL
     with pytest.raises(ValueError, match="unknown port"):
         core.define("x", "async", 1)
 

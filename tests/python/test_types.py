@@ -26,7 +26,6 @@ def test_wrong_argument_types_raise_type_error(session, core):
         lambda: core.write(ctl=1.0),
         lambda: core.write(ctl=None),
         lambda: core.write(ctl=b"3"),
-        lambda: core.write(ctl=True),
         lambda: core.write({1: 1}),
         lambda: core.write([("ctl", 1)]),
         lambda: core.write(clk=[0] * 15 + [None]),

@@ -35,6 +35,8 @@ def test_write_of_ints_is_checked_against_the_width(core):
         core.write(ctl=-1)
     core.define("back", "async_in", [0, 1, 2])
     assert core.read()["back"].value == 7  # the refused writes sent nothing
+    core.write(ctl=True)
+    assert core.read()["back"].value == 1
 
 
 def test_pulse_train_is_seen_cycle_by_cycle(session, core):
