@@ -1,0 +1,114 @@
+// --json output parsed back and compared with the target and with the table output.
+#include <gtest/gtest.h>
+
+#include "ToolOutput.h"
+#include "ToolRunner.h"
+#include "ZinSim/Description.h"
+
+namespace {
+
+using nlohmann::json;
+using zinmox_test::jsonDocuments;
+using zinmox_test::runTool;
+
+TEST(JsonOutput, ScanAndInfoMatchTheDemoDesign) {
+  const auto scan = runTool({"scan", "--json"});
+  ASSERT_EQ(scan.status, 0) << scan.err;
+  const json document = json::parse(scan.out);
+  const ZinSim::TargetDescription design = ZinSim::demoDescription();
+  ASSERT_EQ(document["cores"].size(), design.cores.size());
+  for (size_t i = 0; i < design.cores.size(); ++i) {
+    const ZinSim::CoreDescription& core = design.cores[i];
+    const json& entry = document["cores"][i];
+    EXPECT_EQ(entry["core_type"], core.type);
+    EXPECT_EQ(entry["mox"], core.type == ZinSim::kMoxCoreType);
+    EXPECT_EQ(entry["core_major_version"], core.majorVersion);
+    EXPECT_EQ(entry["core_minor_version"], core.minorVersion);
+    EXPECT_EQ(entry["manufacturer_id"], core.manufacturerId);
+    if (core.type == ZinSim::kMoxCoreType) {
+      EXPECT_EQ(entry["async_output_count"], core.asyncOutputs);
+      EXPECT_EQ(entry["sync_output_count"], core.syncOutputs);
+      EXPECT_EQ(entry["async_input_count"], core.asyncInputs);
+      EXPECT_EQ(entry["sync_input_count"], core.syncInputs);
+    } else {
+      EXPECT_FALSE(entry.contains("async_output_count"));
+    }
+  }
+
+  const auto info = runTool({"info", "0x0:0x1:0x0", "--json"});
+  ASSERT_EQ(info.status, 0) << info.err;
+  const json fields = json::parse(info.out);
+  EXPECT_EQ(fields.size(), 13u);  // the reference and the twelve fields
+  EXPECT_EQ(fields["core"], "0:1:0");
+  EXPECT_EQ(fields["core_type"], 9);
+  EXPECT_EQ(fields["qx_major_version"], design.cores[0].qxMajorVersion);
+  EXPECT_EQ(fields["sync_input_count"], design.cores[0].syncInputs);
+  for (const auto& [key, value] : document["cores"][0].items()) {
+    if (key != "core" && key != "mox") {
+      EXPECT_EQ(fields[key], value) << key;
+    }
+  }
+}
+
+// Named reads and whole-port reads after writes in one session, as JSON.
+TEST(JsonOutput, ReadsShowTheLoopbackOfWrites) {
+  const auto result = runTool({"run", "-"},
+                              "define 0:1:1 nibble async_out 3-0\n"
+                              "define 0:1:1 nibble_in async_in 3-0\n"
+                              "define 0:1:1 pair_in sync_in 0,1\n"
+                              "write 0:1:1 nibble=6 sync_out_data=3\n"
+                              "read 0:1:1 nibble_in pair_in async_in_data --json\n"
+                              "ports 0:1:1 write --async C3\n"
+                              "ports 0:1:1 read --json\n");
+  ASSERT_EQ(result.status, 0) << result.err;
+  const auto documents = jsonDocuments(result.out);
+  ASSERT_EQ(documents.size(), 2u) << result.out;
+
+  const json& read = documents[0];
+  EXPECT_EQ(read["core"], "0:1:1");
+  ASSERT_EQ(read["signals"].size(), 3u);
+  const json& nibble = read["signals"][0];
+  EXPECT_EQ(nibble["name"], "nibble_in");
+  EXPECT_EQ(nibble["width"], 4);
+  // Value bit i is port bit 3 - i on both sides, so the value comes back unchanged.
+  EXPECT_EQ(nibble["value"], "6");
+  EXPECT_EQ(nibble["activity_up"], "6");
+  EXPECT_FALSE(nibble.contains("sync_activity_up"));
+  const json& pair = read["signals"][1];
+  EXPECT_EQ(pair["width"], 2);
+  EXPECT_EQ(pair["value"], "3");
+  EXPECT_EQ(pair["sync_activity_up"], "3");
+  EXPECT_EQ(pair["sync_activity_down"], "0");
+  const json& whole = read["signals"][2];
+  EXPECT_EQ(whole["name"], "async_in_data");
+  EXPECT_EQ(whole["width"], 8);
+  EXPECT_EQ(whole["value"], "06");  // nibble=6 on bits 3-0 in reverse order: bits 1 and 2
+
+  const json& ports = documents[1];
+  EXPECT_EQ(ports["async_in"]["width"], 8);
+  EXPECT_EQ(ports["async_in"]["value"], "C3");
+  EXPECT_EQ(ports["async_in"]["activity_up"], "C1");  // 06 -> C3 since the previous read
+  EXPECT_EQ(ports["async_in"]["activity_down"], "04");
+  EXPECT_EQ(ports["sync_in"]["value"], "3");
+  EXPECT_FALSE(ports["async_in"].contains("sync_activity_up"));
+}
+
+// The table and the JSON of one read state the same values.
+TEST(JsonOutput, AgreesWithTheTable) {
+  const auto result = runTool({"run", "-"},
+                              "write 0:1:0 async_out_data=1234\n"
+                              "read 0:1:0 async_in_data\n"
+                              "write 0:1:0 async_out_data=1234\n"
+                              "read 0:1:0 async_in_data --json\n");
+  ASSERT_EQ(result.status, 0) << result.err;
+  const auto rows = zinmox_test::rowsStartingWith(result.out, "async_in_data");
+  ASSERT_EQ(rows.size(), 1u);
+  const auto documents = jsonDocuments(result.out);
+  ASSERT_EQ(documents.size(), 1u);
+  const json& signal = documents[0]["signals"][0];
+  EXPECT_EQ(rows[0][2], signal["value"]);
+  EXPECT_EQ(signal["value"], "1234");
+  EXPECT_EQ(signal["activity_up"], "0000") << "an unchanged write brings no activity";
+}
+
+}  // namespace
