@@ -104,3 +104,26 @@ def test_calls_from_several_threads():
         for thread in threads:
             thread.join()
         assert failures == []
+
+
+def test_close_waits_for_a_call_in_another_thread():
+    session = zinmox.Session()
+    core = session.core("0:1:0").init()
+    started = threading.Event()
+    outcomes = []
+
+    def reader():
+        try:
+            while True:
+                core.read()
+                started.set()
+        except zinmox.Error as error:
+            outcomes.append(str(error))
+
+    thread = threading.Thread(target=reader)
+    thread.start()
+    assert started.wait(10)
+    session.close()
+    thread.join(10)
+    assert not thread.is_alive()
+    assert outcomes == ["The session is closed."]
