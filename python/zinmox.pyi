@@ -11,7 +11,7 @@ CoreRef = tuple[int, int, int] | list[int] | str
 Port = Literal["sync_out", "sync_in", "async_out", "async_in"]
 InputPort = Literal["sync_in", "async_in"]
 StepValue = int | str
-WriteValue = int | str | Sequence[StepValue]
+WriteValue = int | str | list[StepValue] | tuple[StepValue, ...]
 
 class Error(RuntimeError):
     """A failed call. str() gives the session's message texts of that call, one per line."""
