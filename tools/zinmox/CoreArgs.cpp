@@ -6,8 +6,8 @@
 namespace zinmox {
 
 const char* const kSignalsHelp =
-    "JSON file of signal definitions: {\"signals\": [{\"name\": \"leds\", \"port\": "
-    "\"async_out\", \"bits\": [0, 1, 2, 3]}]}; ports async_out, sync_out, async_in, sync_in";
+    "JSON file naming signals, e.g. {\"signals\": [{\"name\": \"leds\", \"port\": "
+    "\"async_out\", \"bits\": \"0-7\"}]} (ports async_out, sync_out, async_in, sync_in)";
 
 void addRefArgument(CLI::App& command, CoreArgs& args) {
   command.add_option("REF", args.ref, "core reference DEVICE:CHAIN:CORE, for example 0:1:0")
