@@ -1,6 +1,10 @@
 // Turns the `target` argument of Session into a transport.
 #include "Transport.h"
 
+#include <optional>
+
+#include "ZinNet/Endpoint.h"
+#include "ZinNet/TcpTransport.h"
 #include "ZinSim/Description.h"
 
 namespace py = pybind11;
@@ -25,10 +29,30 @@ TransportChoice fromDescription(const ZinSim::TargetDescription& description, st
   }
 }
 
-TransportChoice fromPath(const std::string& path) {
-  if (path.rfind("tcp://", 0) == 0) {
-    throw py::value_error("network targets (" + path + ") are not supported by this build");
+// "tcp://HOST:PORT": a target server, connected at once so that a missing one is reported here
+// (ConnectionError); a malformed address raises ValueError.
+TransportChoice fromServer(const std::string& url) {
+  std::optional<ZinNet::Endpoint> server;
+  try {
+    server = ZinNet::parseTcpTarget(url);
+  } catch (const std::invalid_argument& error) {
+    throw py::value_error(error.what());
   }
+  auto transport = std::make_shared<ZinNet::TcpTransport>(*server);
+  try {
+    transport->connect();
+  } catch (const ZinNet::NetError& error) {
+    PyErr_SetString(PyExc_ConnectionError, error.what());
+    throw py::error_already_set();
+  }
+  TransportChoice choice;
+  choice.transport = std::move(transport);
+  choice.description = "target server " + server->text();
+  return choice;
+}
+
+TransportChoice fromPath(const std::string& path) {
+  if (path.rfind("tcp://", 0) == 0) return fromServer(path);
   try {
     return fromDescription(ZinSim::loadDescription(path), "description file " + path);
   } catch (const ZinSim::DescriptionError& error) {

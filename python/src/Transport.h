@@ -18,7 +18,8 @@ struct TransportChoice {
   std::string description;                    // for repr()
 };
 
-/// None: the built-in demo design; a str or path-like: a description file; a dict: a description
+/// None: the built-in demo design; "tcp://HOST:PORT": a target server (ConnectionError when it
+/// cannot be reached); a str or path-like: a description file; a dict: a description
 /// in the description format. Raises TypeError for other types and ValueError for an unusable
 /// description (its text names the place of the problem).
 TransportChoice makeTransport(const pybind11::object& target);
