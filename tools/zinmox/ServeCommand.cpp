@@ -1,5 +1,7 @@
 // zinmox serve: holds a target and serves it to other processes over TCP.
 #include <iostream>
+#include <memory>
+#include <mutex>
 
 #include "Commands.h"
 #include "Errors.h"
@@ -26,8 +28,11 @@ void serve(Session& session, const std::string& listen) {
   options.port = endpoint.port;
   options.name = "zinmox serve: " + describeTarget(session.targetSpec());
   options.stopOnSignals = true;
-  options.log = [](const std::string& line) {
-    std::cout << "zinmox serve: " << line << std::endl;  // one flushed line per event
+  // The server logs from its own thread: one flushed line per event, never mixed with ours.
+  auto outputMutex = std::make_shared<std::mutex>();
+  options.log = [outputMutex](const std::string& line) {
+    std::lock_guard<std::mutex> lock(*outputMutex);
+    std::cout << "zinmox serve: " << line << std::endl;
   };
   ZinNet::Server server(openTarget(session.targetSpec()), options);
   try {
@@ -35,9 +40,12 @@ void serve(Session& session, const std::string& listen) {
   } catch (const std::runtime_error& error) {
     throw Failure(error.what());
   }
-  std::cout << "zinmox serve: serving " << describeTarget(session.targetSpec())
-            << "; connect with --target tcp://" << server.address() << "; Ctrl-C or SIGTERM stops"
-            << std::endl;
+  {
+    std::lock_guard<std::mutex> lock(*outputMutex);
+    std::cout << "zinmox serve: serving " << describeTarget(session.targetSpec())
+              << "; connect with --target tcp://" << server.address() << "; Ctrl-C or SIGTERM stops"
+              << std::endl;
+  }
   server.wait();
   server.stop();
 }
