@@ -55,8 +55,9 @@ uint64_t readUInt(const json& j, const std::string& at, uint64_t most) {
     }
     value = std::stoull(text, nullptr, 16);
   } else {
-    fail(at, std::string("expected a number, found ") + typeName(j) +
-                 (j.is_string() ? " " + j.dump() : ""));
+    std::string found = std::string("expected a number, found ") + typeName(j);
+    if (j.is_string()) found.append(" ").append(j.dump());
+    fail(at, found);
   }
   if (value > most) {
     fail(at, "expected a number from 0 to " + std::to_string(most) + ", found " +
@@ -287,7 +288,7 @@ TargetDescription parseDescription(std::string_view jsonText) {
   json document;
   try {
     document = json::parse(jsonText.begin(), jsonText.end());
-  } catch (const json::parse_error& e) {
+  } catch (const json::exception& e) {  // also a number too large for any type (out_of_range)
     fail("", std::string("not valid JSON: ") + e.what());
   }
   return readTarget(document);
