@@ -19,6 +19,7 @@ void expectError(const ErrorCase& c) {
   for (const auto& arg : c.args) line += " " + arg;
   const auto result = runTool(c.args);
   EXPECT_EQ(result.signal, 0) << "zinmox" << line << " crashed";
+  EXPECT_EQ(result.err.find("Sanitizer"), std::string::npos) << "zinmox" << line << result.err;
   EXPECT_EQ(result.status, c.status) << "zinmox" << line << "\n" << result.err;
   EXPECT_NE(result.err.find(c.message), std::string::npos)
       << "zinmox" << line << "\nstderr: " << result.err;
