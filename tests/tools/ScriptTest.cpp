@@ -99,12 +99,15 @@ TEST(Script, UsesADescribedTarget) {
   EXPECT_TRUE(rowsStartingWith(scan.out, "0:1:0").empty());
 
   const auto run = runTool({"run", "-", "--target", target},
-                           "ports 2:3:4 write --async 0A5 --sync 5\nports 2:3:4 read\n");
+                           "ports 2:3:4 write --async 0A5 --sync 5\nports 2:3:4 read\n"
+                           "ports 2:3:4 write --async 0 --async-mask 0F0\nports 2:3:4 read\n");
   ASSERT_EQ(run.status, 0) << run.err;
   const auto async = rowsStartingWith(run.out, "async_in");
-  ASSERT_EQ(async.size(), 1u);
+  ASSERT_EQ(async.size(), 2u);
   EXPECT_EQ(async[0][2], "FA5") << "bits 8-11 are wired to a constant 1";
   EXPECT_EQ(rowsStartingWith(run.out, "sync_in")[0][2], "5");
+  EXPECT_EQ(async[1][2], "F05") << "the mask updates bits 4-7 only";
+  EXPECT_EQ(async[1][4], "0A0") << "falling activity of the cleared bits";
 }
 
 }  // namespace

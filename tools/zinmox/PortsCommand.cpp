@@ -109,6 +109,10 @@ void writePorts(Session& session, const PortsArgs& args) {
   if (!args.async && !args.sync && !args.syncTrain) {
     throw UsageError("nothing to write: give --async, --sync or --sync-train");
   }
+  if (args.asyncMask && !args.async) throw UsageError("--async-mask needs --async");
+  if (args.syncMask && !args.sync && !args.syncTrain) {
+    throw UsageError("--sync-mask needs --sync or --sync-train");
+  }
   ZIN_CORE_REF ref = prepareCore(session, args.core);
   const ZINMOX_CORE_INFO info = coreInfo(session, ref);
   std::vector<uint8_t> asyncData, asyncMask, syncData, syncMask;
