@@ -98,7 +98,10 @@ std::string formatBitList(const std::vector<uint32_t>& bits) {
     while (j + 1 < bits.size() && static_cast<int64_t>(bits[j + 1]) - bits[j] == step) ++j;
     if (!text.empty()) text += ",";
     text += std::to_string(bits[i]);
-    if (j > i) text += "-" + std::to_string(bits[j]);
+    if (j > i) {
+      text += '-';
+      text += std::to_string(bits[j]);
+    }
     i = j + 1;
   }
   return text;
