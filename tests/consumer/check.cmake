@@ -7,8 +7,12 @@ if(rc)
   message(FATAL_ERROR "install failed: ${rc}")
 endif()
 set(ENV{PKG_CONFIG_PATH} ${prefix}/lib/pkgconfig)
+# The consumer is built with the flags of the tree it uses (a sanitized tree needs a sanitized
+# consumer, whose runtime must come first).
 execute_process(COMMAND ${CMAKE_COMMAND} -S ${CONSUMER_SOURCE} -B ${WORK_DIR}/build
-  -DCMAKE_PREFIX_PATH=${prefix} -DCMAKE_BUILD_TYPE=Release RESULT_VARIABLE rc)
+  -DCMAKE_PREFIX_PATH=${prefix} -DCMAKE_BUILD_TYPE=Release
+  "-DCMAKE_CXX_FLAGS=${CONSUMER_CXX_FLAGS}" "-DCMAKE_C_FLAGS=${CONSUMER_CXX_FLAGS}"
+  "-DCMAKE_EXE_LINKER_FLAGS=${CONSUMER_LINKER_FLAGS}" RESULT_VARIABLE rc)
 if(rc)
   message(FATAL_ERROR "consumer configure failed: ${rc}")
 endif()
