@@ -19,6 +19,7 @@ if [ ${#fuzzers[@]} -eq 0 ]; then
   fuzzers=(value_map_fuzzer call_sequence_fuzzer sim_command_fuzzer sim_description_fuzzer)
 fi
 
+scripts/setup.sh fuzz
 if [ ! -f "$build/CMakeCache.txt" ]; then
   cmake --preset fuzz -B "$build"
 fi

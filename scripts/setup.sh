@@ -4,6 +4,10 @@ set -euo pipefail
 packages=(cmake g++ make pkg-config googletest libgtest-dev libgmock-dev libbenchmark-dev
   libcli11-dev nlohmann-json3-dev libasio-dev python3 python3-dev python3-pybind11 pybind11-dev
   python3-pytest clang-format)
+# The libFuzzer targets (scripts/fuzz.sh) also need clang and its fuzzing runtime.
+if [ "${1:-}" = "fuzz" ]; then
+  packages+=(clang libclang-rt-14-dev)
+fi
 missing=()
 for p in "${packages[@]}"; do
   dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q "install ok installed" || missing+=("$p")
