@@ -7,6 +7,7 @@
 #include <emmintrin.h>
 #endif
 #include <string>
+#include <utility>
 
 #include "ZinMOX/ZinMOX_Core.h"
 #include "framework/ZinMOX_Framework.h"
@@ -110,16 +111,17 @@ void ZinMOX_Core::setPortBits(uint32_t handle, ZIN_CORE_REF coreRef, const uint8
   checkPortCount(syncOutDataBitCount, moxCoreInfo.sync_output_count, "setPortBits",
                  "syncOutDataBitCount");
   command.clearUpdateMasks();
+  // Each converted string is moved into the image (the image's old string goes), not copied.
   std::string bits;
   if (asyncOutDataBitCount != 0) {
     command.setAsyncOutValueBits(
-        Zin_NumberUtil::bin2ReverseBinStr(asyncOutData, asyncOutDataBitCount, bits));
-    command.setAsyncOutUpdateBits(
-        Zin_NumberUtil::bin2ReverseBinStr(asyncOutUpdateMask, asyncOutDataBitCount, bits));
+        std::move(Zin_NumberUtil::bin2ReverseBinStr(asyncOutData, asyncOutDataBitCount, bits)));
+    command.setAsyncOutUpdateBits(std::move(
+        Zin_NumberUtil::bin2ReverseBinStr(asyncOutUpdateMask, asyncOutDataBitCount, bits)));
   }
   if (syncOutDataBitCount != 0) {
     command.setSyncOutUpdateBits(
-        Zin_NumberUtil::bin2ReverseBinStr(syncOutUpdateMask, syncOutDataBitCount, bits));
+        std::move(Zin_NumberUtil::bin2ReverseBinStr(syncOutUpdateMask, syncOutDataBitCount, bits)));
     stageStepVectors(command, syncOutData, syncOutDataBitCount);
   }
   command.writeOutputs(handle, coreRef);
