@@ -193,7 +193,8 @@ bool runWithFailureAt(uint64_t n) {
   for (size_t i = 0; i < calls.size(); ++i) {
     const std::vector<Message>& messages = messagesOf[i];
     const uint32_t result = results[i];
-    const std::string where = "N=" + std::to_string(n) + " " + calls[i].name + ": ";
+    const std::string where =
+        std::string("N=").append(std::to_string(n)) + " " + calls[i].name + ": ";
     before = before && !failedIn[i];
     if (before) {
       EXPECT_EQ(result, 0u) << where << (messages.empty() ? "" : messages[0].text);

@@ -49,14 +49,20 @@ std::shared_ptr<ZinTarget::ScriptedTransport> moxTarget(const std::vector<ZIN_CO
   return transport;
 }
 
+// "t<id>_", the beginning of every signal name of one thread. (Built by appending: g++ 12
+// mistakes "t" + std::to_string(id) for an overlapping copy at -O3.)
+std::string tagOf(uint32_t id) {
+  std::string tag = "t";
+  tag += std::to_string(id);
+  tag += '_';
+  return tag;
+}
+
 // One thread's work: its own signal names carry its tag, so its messages are recognisable.
 class Worker {
  public:
   Worker(uint32_t id, uint32_t handle, ZIN_CORE_REF ref)
-      : tag_("t" + std::to_string(id) + "_"),
-        handle_(handle),
-        ref_(ref),
-        rng_(id * 2654435761u + 1) {}
+      : id_(id), tag_(tagOf(id)), handle_(handle), ref_(ref), rng_(id * 2654435761u + 1) {}
 
   void run(std::chrono::steady_clock::time_point end) {
     for (uint32_t step = 0; step < kMaxStepsPerThread && std::chrono::steady_clock::now() < end;
@@ -95,8 +101,9 @@ class Worker {
         problems.push_back(where + "code " + std::to_string(m.code) + ": " + m.text);
       // Another thread's names never appear (the not-initialised message names no signal).
       for (uint32_t other = 1; other <= kWorkers; ++other) {
-        const std::string otherTag = "t" + std::to_string(other) + "_";
-        if (otherTag != tag_ && (m.text.find(" " + otherTag) != std::string::npos)) {
+        std::string otherName = " ";
+        otherName += tagOf(other);
+        if (other != id_ && m.text.find(otherName) != std::string::npos) {
           problems.push_back(where + "message about another thread's signal: " + m.text);
         }
       }
@@ -147,6 +154,7 @@ class Worker {
     }
   }
 
+  uint32_t id_;
   std::string tag_;
   uint32_t handle_;
   ZIN_CORE_REF ref_;
