@@ -49,6 +49,9 @@ class ZinMOX_Command {
     syncOutPulseTrains[bit] = std::move(steps);
   }
   void setPulseTrainStep(uint32_t bit, uint32_t step, char c) { syncOutPulseTrains[bit][step] = c; }
+  /// Sets the step strings of synchronous outputs 0 to count-1 from 16 packed step vectors
+  /// (vector t at byte t*ceil(count/8)): character t of output i's string is bit i of vector t.
+  void setStepVectors(const uint8_t* vectors, uint32_t count);
   /// Holds one level on all steps of a synchronous output bit, without building a step string.
   void holdPulseTrain(uint32_t bit, char level) {
     std::string& steps = syncOutPulseTrains[bit];
