@@ -15,11 +15,11 @@ bool isSyncInput(const ZinMOX_SignalGroup& group) {
   return mox::plainSignalType(group.getType()) == Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT;
 }
 
-// Stores the hexadecimal text of a signal's packed vector under `key`, reusing the entry's
-// storage when the key is already there.
-void storeText(ZinMOX_ValueMap& map, const std::string& key, const Zin_ByteBuffer& vector,
-               uint32_t width) {
-  std::unique_ptr<Zin_ByteBuffer> text(vector.bin2HexString(0, width));
+// Stores under `key` the hexadecimal text of the `width`-bit packed vector that starts at byte
+// `start` of `vectors`, reusing the entry's storage when the key is already there.
+void storeText(ZinMOX_ValueMap& map, const std::string& key, const Zin_ByteBuffer& vectors,
+               uint32_t start, uint32_t width) {
+  std::unique_ptr<Zin_ByteBuffer> text(vectors.bin2HexString(start, width));
   map[key].assign(text->ptr(), text->getSize());
 }
 
@@ -28,13 +28,15 @@ void reportSignal(const ZinMOX_SignalGroup& group, ZinMOX_ValueMap& map, std::st
   const uint32_t width = group.size();
   const uint32_t bytes = mox::byteCount(width);
   const bool sync = isSyncInput(group);
-  Zin_ByteBuffer value(bytes, 0, 0), up(bytes, 0, 0), down(bytes, 0, 0);
-  Zin_ByteBuffer syncUp(sync ? bytes : 0, 0, 0), syncDown(sync ? bytes : 0, 0, 0);
-  group.getValues(value.uPtr(), up.uPtr(), down.uPtr(), sync ? syncUp.uPtr() : nullptr,
-                  sync ? syncDown.uPtr() : nullptr, bytes);
+  // The five vectors (value, activity up and down, sync activity up and down) lie one after
+  // another in one zero-filled buffer.
+  Zin_ByteBuffer vectors((sync ? 5 : 3) * bytes, 0, 0);
+  uint8_t* at = vectors.uPtr();
+  group.getValues(at, at + bytes, at + 2 * bytes, sync ? at + 3 * bytes : nullptr,
+                  sync ? at + 4 * bytes : nullptr, bytes);
 
   const std::string& name = group.getKeyName();
-  storeText(map, name, value, width);
+  storeText(map, name, vectors, 0, width);
   const size_t nameLength = name.size();
   const auto keyOf = [&](const char* suffix) -> const std::string& {
     key.assign(name, 0, nameLength);
@@ -42,11 +44,11 @@ void reportSignal(const ZinMOX_SignalGroup& group, ZinMOX_ValueMap& map, std::st
     return key;
   };
   map[keyOf(".value")] = map[name];
-  storeText(map, keyOf(".activity_up"), up, width);
-  storeText(map, keyOf(".activity_down"), down, width);
+  storeText(map, keyOf(".activity_up"), vectors, bytes, width);
+  storeText(map, keyOf(".activity_down"), vectors, 2 * bytes, width);
   if (sync) {
-    storeText(map, keyOf(".sync_activity_up"), syncUp, width);
-    storeText(map, keyOf(".sync_activity_down"), syncDown, width);
+    storeText(map, keyOf(".sync_activity_up"), vectors, 3 * bytes, width);
+    storeText(map, keyOf(".sync_activity_down"), vectors, 4 * bytes, width);
   }
 }
 
