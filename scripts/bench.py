@@ -1,8 +1,10 @@
 #!/usr/bin/env python3
 """Runs the benchmark suite and relates each case to the JTAG wire time of the bits it moves.
 
-For every case it prints the library's CPU time per call (mean over the repetitions, with the
-coefficient of variation as the machine's noise) and its ratio to the wire time N / 30e6 s, where
+For every case it prints the library's CPU time per call (the median over the repetitions, which
+are interleaved in random order so that a burst of load on a shared machine does not fall on all
+repetitions of one case; the coefficient of variation of the repetitions is printed as the
+machine's noise) and its ratio to the wire time N / 30e6 s, where
 N is the number of bits the call shifts (each benchmark records N as its "wire_bits" counter):
 
   write (setPortBits, map writes):  2*A_out + 17*S_out + 1  (the write line)  + 4 (the code-02 line)
@@ -53,7 +55,8 @@ def build(build_dir):
 
 def run(exe, repetitions, name_filter, min_time):
     cmd = [exe, "--benchmark_format=json", "--benchmark_repetitions=%d" % repetitions,
-           "--benchmark_report_aggregates_only=true", "--benchmark_min_time=%g" % min_time]
+           "--benchmark_report_aggregates_only=true", "--benchmark_min_time=%g" % min_time,
+           "--benchmark_enable_random_interleaving=true"]
     if name_filter:
         cmd.append("--benchmark_filter=" + name_filter)
     out = subprocess.run(cmd, check=True, stdout=subprocess.PIPE).stdout
@@ -95,13 +98,19 @@ def report(cases):
     print("%-28s %12s %7s %12s %9s  %s" % ("case", "cpu/call", "noise", "wire time", "ratio",
                                           "target"))
     failed = 0
-    for name, c in cases.items():
+
+    def order(name):  # by benchmark, then by width
+        family, _, width = name.partition("/")
+        return family, int(width) if width.isdigit() else 0
+
+    for name in sorted(cases, key=order):
+        c = cases[name]
         if "error" in c:
             print("%-28s ERROR %s" % (name, c["error"]))
             failed += 1
             continue
-        mean = c.get("mean", 0.0)
-        noise = c.get("stddev", 0.0) / mean if mean else 0.0
+        mean = c.get("median", 0.0)
+        noise = c.get("stddev", 0.0) / c["mean"] if c.get("mean") else 0.0
         wire = c["wire_bits"] / TCK_HZ
         ratio = mean / wire if wire else float("nan")
         verdict = ""
@@ -120,7 +129,7 @@ def report(cases):
 def main():
     parser = argparse.ArgumentParser(description=__doc__.split("\n")[0])
     parser.add_argument("--build-dir", default=os.path.join(ROOT, "build", "bench"))
-    parser.add_argument("--repetitions", type=int, default=5)
+    parser.add_argument("--repetitions", type=int, default=9)
     parser.add_argument("--filter", default="")
     parser.add_argument("--min-time", type=float, default=0.2)
     args = parser.parse_args()
