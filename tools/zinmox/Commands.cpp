@@ -34,7 +34,8 @@ std::unique_ptr<CLI::App> buildApp(Session& session, bool forScript) {
       "Run 'zinmox SUBCOMMAND --help' for the options of a subcommand; 'zinmox demo' for a tour.");
   if (!forScript) {
     app->add_option_function<std::string>(
-           "--target", [&session](const std::string& spec) { session.setTargetSpec(spec); },
+           "--target",
+           [&session](const std::string& targetText) { session.setTargetText(targetText); },
            "JSON description of a simulated target, or tcp://HOST:PORT of a target server "
            "(default: the built-in demo design)")
         ->type_name("FILE");

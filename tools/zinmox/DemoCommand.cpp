@@ -67,7 +67,7 @@ void addDemoCommand(CLI::App& app, Session& session) {
       app.add_subcommand("demo", "A short guided tour on the built-in simulated demo design");
   command->callback([&session] {
     if (session.inScript()) throw UsageError("demo cannot be used inside a script");
-    if (!session.targetSpec().empty()) {
+    if (!session.targetText().empty()) {
       throw UsageError("demo always runs on the built-in demo design; leave out --target");
     }
     runTour();

@@ -89,9 +89,9 @@ void addScanCommand(CLI::App& app, Session& session) {
   command->callback([&session, json] {
     const std::vector<ScannedCore> cores = scanCores(session);
     if (*json) {
-      printJson(cores, describeTarget(session.targetSpec()));
+      printJson(cores, describeTarget(session.targetText()));
     } else if (cores.empty()) {
-      std::cout << "no core answers on " << describeTarget(session.targetSpec()) << "\n";
+      std::cout << "no core answers on " << describeTarget(session.targetText()) << "\n";
     } else {
       printTable(cores);
     }

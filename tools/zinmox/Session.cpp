@@ -38,7 +38,7 @@ std::vector<ZIN_CORE_REF> probeCores(uint32_t handle) {
 
 }  // namespace
 
-Session::Session(std::string targetSpec) : targetSpec_(std::move(targetSpec)) {}
+Session::Session(std::string targetText) : targetText_(std::move(targetText)) {}
 
 Session::~Session() {
   if (handle_ == 0) return;
@@ -49,16 +49,16 @@ Session::~Session() {
   }
 }
 
-void Session::setTargetSpec(const std::string& spec) {
-  if (handle_ != 0 && spec != targetSpec_) {
+void Session::setTargetText(const std::string& targetText) {
+  if (handle_ != 0 && targetText != targetText_) {
     throw UsageError("the target cannot change within one session");
   }
-  targetSpec_ = spec;
+  targetText_ = targetText;
 }
 
 uint32_t Session::handle() {
   if (handle_ != 0) return handle_;
-  transport_ = openTarget(targetSpec_);
+  transport_ = openTarget(targetText_);
   handle_ = ZinJtag_openSession(transport_);
   ZinJtag_setMessageHandler(handle_, &Session::onMessage, this);
   return handle_;

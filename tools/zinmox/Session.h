@@ -17,15 +17,15 @@ namespace zinmox {
 
 class Session {
  public:
-  /// `targetSpec` as openTarget takes it; nothing is opened until the first use.
-  explicit Session(std::string targetSpec = "");
+  /// `targetText` as openTarget takes it; nothing is opened until the first use.
+  explicit Session(std::string targetText = "");
   ~Session();
   Session(const Session&) = delete;
   Session& operator=(const Session&) = delete;
 
   /// Where the target comes from; may change only before the session is opened.
-  void setTargetSpec(const std::string& spec);
-  const std::string& targetSpec() const { return targetSpec_; }
+  void setTargetText(const std::string& targetText);
+  const std::string& targetText() const { return targetText_; }
 
   /// The session handle; opens the target and the session on first use.
   uint32_t handle();
@@ -59,7 +59,7 @@ class Session {
   };
   using DefinitionKey = std::pair<bool, std::string>;  // (input?, lower-case name)
 
-  std::string targetSpec_;
+  std::string targetText_;
   std::shared_ptr<ZinRT::Zin_Transport> transport_;
   uint32_t handle_ = 0;
   uint64_t messageCount_ = 0;

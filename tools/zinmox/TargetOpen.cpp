@@ -14,9 +14,9 @@ namespace zinmox {
 namespace {
 
 // The server of a "tcp://HOST:PORT" target, or nothing for a description file.
-std::optional<ZinNet::Endpoint> tcpEndpoint(const std::string& spec) {
+std::optional<ZinNet::Endpoint> tcpEndpoint(const std::string& targetText) {
   try {
-    return ZinNet::parseTcpTarget(spec);
+    return ZinNet::parseTcpTarget(targetText);
   } catch (const std::invalid_argument& error) {
     throw UsageError(error.what());
   }
@@ -24,9 +24,9 @@ std::optional<ZinNet::Endpoint> tcpEndpoint(const std::string& spec) {
 
 }  // namespace
 
-std::shared_ptr<ZinRT::Zin_Transport> openTarget(const std::string& spec) {
-  if (spec.empty()) return std::make_shared<ZinSim::Target>();
-  if (const std::optional<ZinNet::Endpoint> server = tcpEndpoint(spec)) {
+std::shared_ptr<ZinRT::Zin_Transport> openTarget(const std::string& targetText) {
+  if (targetText.empty()) return std::make_shared<ZinSim::Target>();
+  if (const std::optional<ZinNet::Endpoint> server = tcpEndpoint(targetText)) {
     auto transport = std::make_shared<ZinNet::TcpTransport>(*server);
     try {
       transport->connect();  // report a missing server before any work starts
@@ -36,18 +36,18 @@ std::shared_ptr<ZinRT::Zin_Transport> openTarget(const std::string& spec) {
     return transport;
   }
   try {
-    return std::make_shared<ZinSim::Target>(ZinSim::loadDescription(spec));
+    return std::make_shared<ZinSim::Target>(ZinSim::loadDescription(targetText));
   } catch (const ZinSim::DescriptionError& error) {
-    throw Failure("cannot use the target file " + spec + ": " + error.what());
+    throw Failure("cannot use the target file " + targetText + ": " + error.what());
   }
 }
 
-std::string describeTarget(const std::string& spec) {
-  if (spec.empty()) return "the built-in demo design";
-  if (const std::optional<ZinNet::Endpoint> server = tcpEndpoint(spec)) {
+std::string describeTarget(const std::string& targetText) {
+  if (targetText.empty()) return "the built-in demo design";
+  if (const std::optional<ZinNet::Endpoint> server = tcpEndpoint(targetText)) {
     return "the target server at " + server->text();
   }
-  return spec;
+  return targetText;
 }
 
 }  // namespace zinmox
