@@ -26,6 +26,8 @@ class ZINUTIL_API Zin_NumberUtil {
  public:
   /// Decimal text of `value`, no leading zeros.
   static std::string& uInt2DecStr(uint32_t value, std::string& out);
+  /// The value 0 to 15 of a hexadecimal digit of either case, or -1 for any other character.
+  static int hexDigitValue(char c);
   /// Hexadecimal text of `value` with exactly widthBits/4 digits, zero padded. Throws
   /// std::out_of_range when the value needs more digits (widthBits 0 gives the empty text
   /// for 0). A width that is not a multiple of 4 is rounded down to one.

@@ -5,17 +5,13 @@
 #include <utility>
 
 #include "Convert.h"
+#include "ZinMOX/ZinMOX_CoreInfoFields.h"
 
 namespace py = pybind11;
 
 namespace zinmox {
 
 namespace {
-
-constexpr std::array<const char*, 12> kInfoKeys = {
-    "manufacturer_id",   "core_type",        "core_major_version", "core_minor_version",
-    "core_revision",     "qx_major_version", "qx_minor_version",   "qx_minor_version_alpha",
-    "async_input_count", "sync_input_count", "async_output_count", "sync_output_count"};
 
 uint32_t portCode(const std::string& port) {
   if (port == "sync_out") return ZINMOX_SYNC_OUTPUT;
@@ -72,9 +68,9 @@ py::dict Core::info() {
     return ZinMOX_getCoreInfo(handle, ref, &word);
   });
   py::dict info;
-  for (const char* key : kInfoKeys) {
-    const auto found = map.find(key);
-    info[key] = found == map.end() ? py::int_(0) : py::int_(py::str(found->second));
+  for (const ZinRT::ZinMOX_CoreInfoField& field : ZinRT::ZINMOX_CORE_INFO_FIELDS) {
+    const auto found = map.find(field.key);
+    info[field.key] = found == map.end() ? py::int_(0) : py::int_(py::str(found->second));
   }
   return info;
 }
@@ -134,14 +130,10 @@ const PortWidths& Core::widths() {
 }
 
 py::dict infoDict(const ZINMOX_CORE_INFO& info) {
-  const std::array<uint32_t, 12> fields = {info.manufacturer_id,    info.core_type,
-                                           info.core_major_version, info.core_minor_version,
-                                           info.core_revision,      info.qx_major_version,
-                                           info.qx_minor_version,   info.qx_minor_version_alpha,
-                                           info.async_input_count,  info.sync_input_count,
-                                           info.async_output_count, info.sync_output_count};
   py::dict dict;
-  for (size_t i = 0; i < fields.size(); ++i) dict[kInfoKeys[i]] = fields[i];
+  for (const ZinRT::ZinMOX_CoreInfoField& field : ZinRT::ZINMOX_CORE_INFO_FIELDS) {
+    dict[field.key] = info.*field.member;
+  }
   return dict;
 }
 

@@ -1,20 +1,11 @@
 // Conversions between hex texts and little-endian byte blocks.
 #include "HexText.h"
 
+#include "ZinRT/Zin_NumberUtil.h"
+
 #include <stdexcept>
 
 namespace zinmox {
-
-namespace {
-
-int digitValue(char c) {
-  if (c >= '0' && c <= '9') return c - '0';
-  if (c >= 'A' && c <= 'F') return c - 'A' + 10;
-  if (c >= 'a' && c <= 'f') return c - 'a' + 10;
-  return -1;
-}
-
-}  // namespace
 
 std::string hexText(const std::string& bytes, size_t digits) {
   static constexpr char kDigits[] = "0123456789ABCDEF";
@@ -29,16 +20,18 @@ std::string hexText(const std::string& bytes, size_t digits) {
 
 std::string fitHexText(const std::string& text, size_t bytes) {
   const size_t digits = 2 * bytes;
-  if (text.empty() || digitValue(text[0]) < 0) {
+  if (text.empty() || ZinRT::Zin_NumberUtil::hexDigitValue(text[0]) < 0) {
     throw std::invalid_argument("invalid hex text \"" + text + "\"");
   }
   std::string fitted =
       text.size() >= digits
           ? text.substr(text.size() - digits)
-          : std::string(digits - text.size(), digitValue(text[0]) >= 8 ? 'F' : '0') + text;
+          : std::string(digits - text.size(),
+                        ZinRT::Zin_NumberUtil::hexDigitValue(text[0]) >= 8 ? 'F' : '0') +
+                text;
   std::string block(bytes, '\0');
   for (size_t k = 0; k < digits; ++k) {
-    const int value = digitValue(fitted[digits - 1 - k]);
+    const int value = ZinRT::Zin_NumberUtil::hexDigitValue(fitted[digits - 1 - k]);
     if (value < 0) throw std::invalid_argument("invalid hex text \"" + text + "\"");
     block[k / 2] =
         static_cast<char>(static_cast<unsigned char>(block[k / 2]) | (value << (4 * (k % 2))));

@@ -1,24 +1,15 @@
 // Hexadecimal fields of command lines.
 #include "HexNumber.h"
 
+#include "ZinRT/Zin_NumberUtil.h"
+
 namespace ZinSim {
-
-namespace {
-
-int digitValue(char c) {
-  if (c >= '0' && c <= '9') return c - '0';
-  if (c >= 'A' && c <= 'F') return c - 'A' + 10;
-  if (c >= 'a' && c <= 'f') return c - 'a' + 10;
-  return -1;
-}
-
-}  // namespace
 
 bool parseHexField(std::string_view text, size_t digits, uint32_t& value) {
   if (text.size() != digits) return false;
   value = 0;
   for (char c : text) {
-    const int d = digitValue(c);
+    const int d = ZinRT::Zin_NumberUtil::hexDigitValue(c);
     if (d < 0) return false;
     value = (value << 4) | static_cast<uint32_t>(d);
   }
@@ -29,7 +20,7 @@ std::string parseHexNumber(std::string_view text, uint64_t bitCount, std::vector
   if (text.empty()) return "data field is empty";
   if (number != nullptr) number->assign((bitCount + 7) / 8, 0);
   for (size_t pos = 0; pos < text.size(); ++pos) {
-    const int d = digitValue(text[pos]);
+    const int d = ZinRT::Zin_NumberUtil::hexDigitValue(text[pos]);
     if (d < 0) return "data is not hexadecimal (character " + std::to_string(pos + 1) + ")";
     const uint64_t lowBit = 4 * static_cast<uint64_t>(text.size() - 1 - pos);
     if (d == 0) continue;

@@ -69,6 +69,10 @@ unsigned bitByte(const char* bits) {
 
 }  // namespace
 
+int Zin_NumberUtil::hexDigitValue(char c) {
+  return detail::kHexValues[static_cast<unsigned char>(c)];
+}
+
 std::string& Zin_NumberUtil::uInt2DecStr(uint32_t value, std::string& out) {
   char digits[16];
   const auto result = std::to_chars(digits, digits + sizeof digits, value);

@@ -1,22 +1,13 @@
 // Conversions between hexadecimal texts and packed bit vectors.
 #include "Hex.h"
 
+#include "ZinRT/Zin_NumberUtil.h"
+
 #include <cctype>
 
 #include "Errors.h"
 
 namespace zinmox {
-
-namespace {
-
-int hexValue(char c) {
-  if (c >= '0' && c <= '9') return c - '0';
-  if (c >= 'a' && c <= 'f') return c - 'a' + 10;
-  if (c >= 'A' && c <= 'F') return c - 'A' + 10;
-  return -1;
-}
-
-}  // namespace
 
 std::string cleanHex(const std::string& text, const std::string& what) {
   std::string digits = text;
@@ -25,7 +16,7 @@ std::string cleanHex(const std::string& text, const std::string& what) {
   }
   if (digits.empty()) throw UsageError(what + " is empty: give hexadecimal digits such as 3F");
   for (char c : digits) {
-    if (hexValue(c) < 0) {
+    if (ZinRT::Zin_NumberUtil::hexDigitValue(c) < 0) {
       throw UsageError(what + " '" + text + "' is not a hexadecimal number (digits 0-9, A-F)");
     }
   }
@@ -54,7 +45,8 @@ std::vector<uint8_t> hexToPacked(const std::string& text, uint32_t bitCount,
   std::vector<uint8_t> packed((bitCount + 7) / 8, 0);
   const size_t digitCount = text.size();
   for (size_t d = 0; d < digitCount; ++d) {
-    const unsigned value = static_cast<unsigned>(hexValue(text[digitCount - 1 - d]));
+    const unsigned value =
+        static_cast<unsigned>(ZinRT::Zin_NumberUtil::hexDigitValue(text[digitCount - 1 - d]));
     for (uint32_t b = 0; b < 4; ++b) {
       if (((value >> b) & 1u) == 0) continue;
       const uint64_t bit = d * 4 + b;

@@ -4,10 +4,10 @@
 
 #include "Commands.h"
 #include "CoreArgs.h"
-#include "CoreInfoFields.h"
 #include "CoreRef.h"
 #include "Table.h"
 #include "ZinMOX/ZinMOX.h"
+#include "ZinMOX/ZinMOX_CoreInfoFields.h"
 
 namespace zinmox {
 
@@ -26,14 +26,14 @@ void showInfo(Session& session, const InfoArgs& args) {
                 "reading the information of core " + args.core.ref);
   if (args.json) {
     nlohmann::json object{{"core", formatCoreRef(ref)}};
-    for (const CoreInfoField& field : kCoreInfoFields) {
+    for (const ZinRT::ZinMOX_CoreInfoField& field : ZinRT::ZINMOX_CORE_INFO_FIELDS) {
       object[field.key] = std::stoul(values.at(field.key));
     }
     std::cout << object.dump(2) << "\n";
     return;
   }
   Table table({"field", "value"});
-  for (const CoreInfoField& field : kCoreInfoFields) {
+  for (const ZinRT::ZinMOX_CoreInfoField& field : ZinRT::ZINMOX_CORE_INFO_FIELDS) {
     table.addRow({field.key, values.at(field.key)});
   }
   table.print(std::cout);

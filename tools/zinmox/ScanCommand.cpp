@@ -3,11 +3,11 @@
 #include <nlohmann/json.hpp>
 
 #include "Commands.h"
-#include "CoreInfoFields.h"
 #include "CoreRef.h"
 #include "Table.h"
 #include "TargetOpen.h"
 #include "ZinMOX/ZinMOX.h"
+#include "ZinMOX/ZinMOX_CoreInfoFields.h"
 #include "ZinRT/Zin_CoreComm.h"
 
 namespace zinmox {
@@ -72,7 +72,8 @@ void printJson(const std::vector<ScannedCore>& cores, const std::string& target)
                          {"core_minor_version", core.generic.coreMinorVersion},
                          {"core_revision", core.generic.coreRevision}};
     if (core.generic.coreType == kMoxCoreType) {
-      for (const CoreInfoField& field : kCoreInfoFields) entry[field.key] = core.mox.*field.member;
+      for (const ZinRT::ZinMOX_CoreInfoField& field : ZinRT::ZINMOX_CORE_INFO_FIELDS)
+        entry[field.key] = core.mox.*field.member;
     }
     list.push_back(entry);
   }

@@ -3,31 +3,13 @@
 #include <string>
 
 #include "ZinMOX/ZinMOX.h"
+#include "ZinMOX/ZinMOX_CoreInfoFields.h"
 #include "api/ZinMOX_CallFrame.h"
 
 using namespace ZinRT;
 using namespace ZinRT::mox;
 
 namespace {
-
-// Keys of the information record, in field order.
-struct CoreInfoField {
-  const char* key;
-  uint32_t ZINMOX_CORE_INFO::*field;
-};
-constexpr CoreInfoField CORE_INFO_FIELDS[] = {
-    {"manufacturer_id", &ZINMOX_CORE_INFO::manufacturer_id},
-    {"core_type", &ZINMOX_CORE_INFO::core_type},
-    {"core_major_version", &ZINMOX_CORE_INFO::core_major_version},
-    {"core_minor_version", &ZINMOX_CORE_INFO::core_minor_version},
-    {"core_revision", &ZINMOX_CORE_INFO::core_revision},
-    {"qx_major_version", &ZINMOX_CORE_INFO::qx_major_version},
-    {"qx_minor_version", &ZINMOX_CORE_INFO::qx_minor_version},
-    {"qx_minor_version_alpha", &ZINMOX_CORE_INFO::qx_minor_version_alpha},
-    {"async_input_count", &ZINMOX_CORE_INFO::async_input_count},
-    {"sync_input_count", &ZINMOX_CORE_INFO::sync_input_count},
-    {"async_output_count", &ZINMOX_CORE_INFO::async_output_count},
-    {"sync_output_count", &ZINMOX_CORE_INFO::sync_output_count}};
 
 // Removes whatever core is registered at the reference before a new one is created.
 void removeRegisteredCore(uint32_t handle, ZIN_CORE_REF* coreRef, const ZIN_CORE_REF& ref) {
@@ -104,8 +86,8 @@ uint32_t ZinMOX_getCoreInfo(uint32_t handle, ZIN_CORE_REF* coreRef, uintptr_t* c
 
     auto& map = *reinterpret_cast<ZinMOX_ValueMap*>(*coreInfo);
     std::string text;
-    for (const CoreInfoField& entry : CORE_INFO_FIELDS) {
-      map[entry.key] = Zin_NumberUtil::uInt2DecStr(record.*entry.field, text);
+    for (const ZinMOX_CoreInfoField& entry : ZINMOX_CORE_INFO_FIELDS) {
+      map[entry.key] = Zin_NumberUtil::uInt2DecStr(record.*entry.member, text);
     }
     return CALL_SUCCESS;
   });

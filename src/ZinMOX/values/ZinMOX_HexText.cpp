@@ -9,13 +9,6 @@ namespace ZinRT::mox {
 
 namespace {
 
-int hexDigitValue(char c) {
-  if (c >= '0' && c <= '9') return c - '0';
-  if (c >= 'A' && c <= 'F') return c - 'A' + 10;
-  if (c >= 'a' && c <= 'f') return c - 'a' + 10;
-  return -1;
-}
-
 [[noreturn]] void failInvalid(const std::string& text) {
   throw std::logic_error("Invalid Hex String: " + text);
 }
@@ -27,7 +20,7 @@ uint32_t parseHexString(const char* text) {
   if (digit[0] == '0' && (digit[1] == 'x' || digit[1] == 'X')) digit += 2;
   uint32_t value = 0;
   for (; *digit != '\0'; ++digit) {
-    const int digitValue = hexDigitValue(*digit);
+    const int digitValue = Zin_NumberUtil::hexDigitValue(*digit);
     if (digitValue < 0) failInvalid(text);
     value = (value << 4) | static_cast<uint32_t>(digitValue);
   }
@@ -53,7 +46,7 @@ std::unique_ptr<Zin_ByteBuffer> fitHexString(const char* text, int32_t bitWidth)
   }
   out[digits] = '\0';
   for (size_t i = 0; i < digits; ++i) {
-    if (hexDigitValue(out[i]) < 0) failInvalid(text);
+    if (Zin_NumberUtil::hexDigitValue(out[i]) < 0) failInvalid(text);
   }
   return fitted;
 }

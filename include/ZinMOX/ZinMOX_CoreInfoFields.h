@@ -1,21 +1,22 @@
-// The twelve fields of a MOX core's information, by the keys that ZinMOX_getCoreInfo writes.
-#ifndef ZINMOX_TOOL_COREINFOFIELDS_H
-#define ZINMOX_TOOL_COREINFOFIELDS_H
+// The keys under which ZinMOX_getCoreInfo reports the fields of a MOX core's information record.
+#ifndef ZINMOX_COREINFOFIELDS_H
+#define ZINMOX_COREINFOFIELDS_H
 
 #include <array>
 #include <cstdint>
 
 #include "ZinMOX/ZinMOX_CoreInfo.h"
 
-namespace zinmox {
+namespace ZinRT {
 
-struct CoreInfoField {
+/// One field of ZINMOX_CORE_INFO and its key.
+struct ZinMOX_CoreInfoField {
   const char* key;
   uint32_t ZINMOX_CORE_INFO::*member;
 };
 
-/// In the record's field order.
-inline constexpr std::array<CoreInfoField, 12> kCoreInfoFields{{
+/// The twelve fields in the record's order.
+inline constexpr std::array<ZinMOX_CoreInfoField, 12> ZINMOX_CORE_INFO_FIELDS{{
     {"manufacturer_id", &ZINMOX_CORE_INFO::manufacturer_id},
     {"core_type", &ZINMOX_CORE_INFO::core_type},
     {"core_major_version", &ZINMOX_CORE_INFO::core_major_version},
@@ -30,6 +31,6 @@ inline constexpr std::array<CoreInfoField, 12> kCoreInfoFields{{
     {"sync_output_count", &ZINMOX_CORE_INFO::sync_output_count},
 }};
 
-}  // namespace zinmox
+}  // namespace ZinRT
 
 #endif
