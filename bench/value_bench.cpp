@@ -34,6 +34,15 @@ std::string hexText(size_t digits, uint32_t seed) {
   return text;
 }
 
+// One value-map call per iteration; the first failure, which check() reports, ends the loop.
+using ValueCall = uint32_t (*)(uint32_t, ZIN_CORE_REF*, uintptr_t*);
+void timeValueCalls(benchmark::State& state, BenchSession& session, ValueCall call, uintptr_t& word,
+                    const char* name) {
+  for (auto _ : state) {
+    if (!session.check(call(session.handle(), session.ref(), &word), name)) break;
+  }
+}
+
 void BM_SmallNamedWrite(benchmark::State& state) {
   BenchSession session(state, kSmallWidth);
   if (!session.check(ZinMOX_defineBus(session.handle(), session.ref(), "ctl", ZINMOX_ASYNC_OUTPUT,
@@ -43,12 +52,7 @@ void BM_SmallNamedWrite(benchmark::State& state) {
   }
   ZinMOX_ValueMap map{{"ctl", "3F"}};
   uintptr_t word = mapWord(map);
-  for (auto _ : state) {
-    if (!session.check(ZinMOX_writeValues(session.handle(), session.ref(), &word),
-                       "ZinMOX_writeValues")) {
-      break;
-    }
-  }
+  timeValueCalls(state, session, ZinMOX_writeValues, word, "ZinMOX_writeValues");
   setWireBits(state, writeWireBits(kSmallWidth, kSmallWidth));
 }
 
@@ -61,12 +65,7 @@ void BM_SmallNamedRead(benchmark::State& state) {
   }
   ZinMOX_ValueMap map;
   uintptr_t word = mapWord(map);
-  for (auto _ : state) {
-    if (!session.check(ZinMOX_readValues(session.handle(), session.ref(), &word),
-                       "ZinMOX_readValues")) {
-      break;
-    }
-  }
+  timeValueCalls(state, session, ZinMOX_readValues, word, "ZinMOX_readValues");
   setWireBits(state, readWireBits(kSmallWidth, kSmallWidth));
 }
 
@@ -78,12 +77,7 @@ void BM_MapWriteAllOutputs(benchmark::State& state) {
   ZinMOX_ValueMap map{{"async_out_data", hexText(digits, 1)},
                       {"sync_out_data", hexText(digits, 2)}};
   uintptr_t word = mapWord(map);
-  for (auto _ : state) {
-    if (!session.check(ZinMOX_writeValues(session.handle(), session.ref(), &word),
-                       "ZinMOX_writeValues")) {
-      break;
-    }
-  }
+  timeValueCalls(state, session, ZinMOX_writeValues, word, "ZinMOX_writeValues");
   setWireBits(state, writeWireBits(width, width));
 }
 
@@ -93,12 +87,7 @@ void BM_MapReadAllInputs(benchmark::State& state) {
   BenchSession session(state, width);
   ZinMOX_ValueMap map;
   uintptr_t word = mapWord(map);
-  for (auto _ : state) {
-    if (!session.check(ZinMOX_readValues(session.handle(), session.ref(), &word),
-                       "ZinMOX_readValues")) {
-      break;
-    }
-  }
+  timeValueCalls(state, session, ZinMOX_readValues, word, "ZinMOX_readValues");
   setWireBits(state, readWireBits(width, width));
 }
 
@@ -108,12 +97,7 @@ void BM_MapWritePulseTrain(benchmark::State& state) {
   BenchSession session(state, width);
   ZinMOX_ValueMap map{{"sync_out_data.pulsetrain", hexText(32 * ((width + 7) / 8), 3)}};
   uintptr_t word = mapWord(map);
-  for (auto _ : state) {
-    if (!session.check(ZinMOX_writeValues(session.handle(), session.ref(), &word),
-                       "ZinMOX_writeValues")) {
-      break;
-    }
-  }
+  timeValueCalls(state, session, ZinMOX_writeValues, word, "ZinMOX_writeValues");
   setWireBits(state, writeWireBits(width, width));
 }
 
