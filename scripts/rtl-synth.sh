@@ -108,6 +108,10 @@ if [ -f ice40_8.json ]; then
       printf "iCE40 HX8K %-5s Fmax %7s MHz (goal %s MHz)\n" "$name" "${mhz:-?}" "$goal"
       awk -v m="${mhz:-0}" -v g="$goal" 'BEGIN { exit !(m >= g) }' || fail "$name below $goal MHz"
     done
+    # TDO is taken on the falling TCK edge: the path from TCK to the TDO pin gets half a period.
+    ns=$(grep -E "Max delay posedge tck_i.* -> <async>" pnr.log | tail -1 | sed -E 's/.*: ([0-9.]+) ns.*/\1/')
+    printf "iCE40 HX8K TCK to TDO pin %6s ns (at most 16.6 ns, half a period at 30 MHz)\n" "${ns:-?}"
+    awk -v n="${ns:-99}" 'BEGIN { exit !(n <= 16.6) }' || fail "TCK to TDO too slow"
   else
     fail "nextpnr-ice40 failed (see $work/pnr.log)"
   fi
