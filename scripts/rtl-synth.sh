@@ -44,6 +44,12 @@ check_top() {
 for file in "${rtl[@]}"; do check_top "$(basename "$file" .v)" "${rtl[*]}"; done
 for file in "$root"/rtl/vendor/zinmox_*.v; do check_top "$(basename "$file" .v)" "${vendor[*]}"; done
 
+# The vendor wrappers through their family's synthesis, the primitive kept as a black box.
+run_yosys synth_bscane2 "read_verilog ${vendor[*]}; synth_xilinx -flatten -top zinmox_bscane2; \
+  select -assert-count 1 t:BSCANE2"
+run_yosys synth_jtagg "read_verilog ${vendor[*]}; synth_ecp5 -top zinmox_jtagg; \
+  select -assert-count 1 t:JTAGG"
+
 # Sums the cells of a stat report whose names match a pattern.
 count() { awk -v re="$2" '$1 ~ re { n += $2 } END { print n + 0 }' "$1"; }
 
