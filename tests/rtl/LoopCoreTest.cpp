@@ -4,6 +4,7 @@
 
 #include <cstdlib>
 #include <random>
+#include <utility>
 
 #include "HubClient.h"
 #include "Vzinmox_loop_top.h"
@@ -17,6 +18,19 @@ struct Levels {
   uint32_t async, sync;
 };
 
+// A stage image of the 8/8/8/8 core from bit masks and trains.
+Image image(uint32_t async, uint32_t asyncMarks, const std::vector<uint16_t>& trains,
+            uint32_t syncMarks) {
+  Image im;
+  for (int i = 0; i < 8; ++i) {
+    im.asyncValue.push_back((async >> i) & 1u);
+    im.asyncMark.push_back((asyncMarks >> i) & 1u);
+    im.trains.push_back(trains[static_cast<size_t>(i)]);
+    im.syncMark.push_back((syncMarks >> i) & 1u);
+  }
+  return im;
+}
+
 class LoopCore : public ::testing::Test {
  protected:
   explicit LoopCore(ClockPlan plan = {1, 40, 0, 1}) : bench_(plan), hub_(bench_, waitBits(plan)) {
@@ -25,17 +39,6 @@ class LoopCore : public ::testing::Test {
     });
     bench_.resetTap();
     bench_.ir(0x8);
-  }
-  static Image image(uint32_t async, uint32_t asyncMarks, const std::vector<uint16_t>& trains,
-                     uint32_t syncMarks) {
-    Image im;
-    for (int i = 0; i < 8; ++i) {
-      im.asyncValue.push_back((async >> i) & 1u);
-      im.asyncMark.push_back((asyncMarks >> i) & 1u);
-      im.trains.push_back(trains[static_cast<size_t>(i)]);
-      im.syncMark.push_back((syncMarks >> i) & 1u);
-    }
-    return im;
   }
   // The edge at which the async outputs last changed to `value`.
   size_t edgeOf(uint32_t value) const {
@@ -95,31 +98,69 @@ TEST_F(LoopCore, UpdateMarksLeaveUnmarkedBitsAlone) {
   EXPECT_EQ(bench_.model().sync_out_o, 0xFFu);
 }
 
-// Random images and marks against a model of the outputs, read back through the loopback.
-// ZINMOX_RTL_ITERATIONS sets the number of rounds (the long run sets thousands).
-TEST_F(LoopCore, RandomWritesMatchTheModel) {
+// The activity a 16-step train leaves on a sync input whose level was `from`: {up, down}.
+std::pair<bool, bool> trainActivity(bool from, uint16_t train) {
+  bool up = false, down = false, level = from;
+  for (int t = 0; t < 16; ++t) {
+    const bool next = (train >> t) & 1u;
+    up |= next && !level;
+    down |= !next && level;
+    level = next;
+  }
+  return {up, down};
+}
+
+// Random images and marks under random clock ratios with jitter, against a model of the outputs
+// and of the activity that each commit leaves on the loopback inputs. ZINMOX_RTL_ITERATIONS sets
+// the number of sessions of 4 writes, each with its own clocks (the long run sets thousands).
+TEST(LoopCoreRandom, RandomWritesAndActivityMatchTheModel) {
   const char* env = std::getenv("ZINMOX_RTL_ITERATIONS");
-  const long rounds = env ? std::strtol(env, nullptr, 10) : 6;
+  const long sessions = env ? std::strtol(env, nullptr, 10) : 4;
   std::mt19937 rng(2024);
-  uint32_t async = 0, sync = 0;
-  for (long r = 0; r < rounds; ++r) {
-    std::vector<uint16_t> trains;
-    for (int j = 0; j < 8; ++j) trains.push_back(static_cast<uint16_t>(rng()));
-    const uint32_t v = rng() & 0xFF, am = rng() & 0xFF, sm = rng() & 0xFF;
-    hub_.stage(0, image(v, am, trains, sm));
-    commit();
-    async = (async & ~am) | (v & am);
-    for (int j = 0; j < 8; ++j) {
-      if ((sm >> j) & 1u)
-        sync = (sync & ~(1u << j)) | (((trains[static_cast<size_t>(j)] >> 15) & 1u) << j);
-    }
-    bench_.runClocks(20);
-    ASSERT_EQ(bench_.model().async_out_o, async) << "round " << r;
-    ASSERT_EQ(bench_.model().sync_out_o, sync) << "round " << r;
-    const auto in = hub_.capture(0, 8, 8);
-    for (int i = 0; i < 8; ++i) {
-      ASSERT_EQ(in[static_cast<size_t>(i)].value, (async >> i) & 1u) << "round " << r;
-      ASSERT_EQ(in[static_cast<size_t>(8 + i)].value, (sync >> i) & 1u) << "round " << r;
+  for (long session = 0; session < sessions; ++session) {
+    std::uniform_real_distribution<double> period(1, 20), jitter(0, 0.4);
+    const ClockPlan plan{period(rng), period(rng), jitter(rng), static_cast<uint32_t>(rng())};
+    SCOPED_TRACE(::testing::PrintToString(plan));
+    Bench bench(plan);
+    HubClient<Bench> hub(bench, waitBits(plan));
+    bench.resetTap();
+    bench.ir(0x8);
+    uint32_t async = 0, sync = 0;
+    for (int r = 0; r < 4; ++r) {
+      std::vector<uint16_t> trains;
+      for (int j = 0; j < 8; ++j) trains.push_back(static_cast<uint16_t>(rng()));
+      const uint32_t v = rng() & 0xFF, am = rng() & 0xFF, sm = rng() & 0xFF;
+      hub.stage(0, image(v, am, trains, sm));
+      ASSERT_EQ(hub.result(kClear, 0), 1);
+      ASSERT_EQ(hub.result(kCommit, 0), 1);
+      const uint32_t newAsync = (async & ~am) | (v & am);
+      uint32_t newSync = sync, syncUp = 0, syncDown = 0;
+      for (int j = 0; j < 8; ++j) {
+        if (((sm >> j) & 1u) == 0) continue;
+        const uint16_t train = trains[static_cast<size_t>(j)];
+        const auto [up, down] = trainActivity((sync >> j) & 1u, train);
+        syncUp |= uint32_t{up} << j;
+        syncDown |= uint32_t{down} << j;
+        newSync = (newSync & ~(1u << j)) | (((train >> 15) & 1u) << j);
+      }
+      bench.runClocks(24);
+      ASSERT_EQ(bench.model().async_out_o, newAsync) << "round " << r;
+      ASSERT_EQ(bench.model().sync_out_o, newSync) << "round " << r;
+      const auto in = hub.capture(0, 8, 8);
+      for (size_t i = 0; i < 8; ++i) {
+        const InputReading& a = in[i];
+        const InputReading& y = in[8 + i];
+        ASSERT_EQ(a.value, (newAsync >> i) & 1u) << "round " << r << " async " << i;
+        ASSERT_EQ(a.up, ((newAsync & ~async) >> i) & 1u) << "round " << r << " async " << i;
+        ASSERT_EQ(a.down, ((async & ~newAsync) >> i) & 1u) << "round " << r << " async " << i;
+        ASSERT_EQ(y.value, (newSync >> i) & 1u) << "round " << r << " sync " << i;
+        ASSERT_EQ(y.up, (syncUp >> i) & 1u) << "round " << r << " sync " << i;
+        ASSERT_EQ(y.down, (syncDown >> i) & 1u) << "round " << r << " sync " << i;
+        ASSERT_EQ(y.syncUp, y.up);
+        ASSERT_EQ(y.syncDown, y.down);
+      }
+      async = newAsync;
+      sync = newSync;
     }
   }
 }
