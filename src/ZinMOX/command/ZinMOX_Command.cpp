@@ -1,5 +1,5 @@
 // The port image of a MOX core: sizing, staging resets, command text and the two transfers.
-#include "ZinMOX/ZinMOX_Command.h"
+#include "internal/ZinMOX_Command.h"
 
 #include <algorithm>
 #include <array>

@@ -7,7 +7,7 @@
 #include <emmintrin.h>
 #endif
 
-#include "ZinMOX/ZinMOX_Command.h"
+#include "internal/ZinMOX_Command.h"
 #include "framework/ZinMOX_Framework.h"
 
 namespace ZinRT {

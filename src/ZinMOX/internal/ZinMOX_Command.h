@@ -16,8 +16,7 @@ namespace ZinRT {
 /// The image of a core's four ports as '0'/'1' strings (character i is port bit i), and the only
 /// place where command text is built and sent. Writers call clearUpdateMasks, stage characters,
 /// then writeOutputs; readers call readInputs, then read characters. Owned by value by its core;
-/// used under the session's target lock, one thread at a time. Not exported: hosts see it only
-/// as a type.
+/// used under the session's target lock, one thread at a time. Internal to the library.
 class ZinMOX_Command {
  public:
   static constexpr uint32_t STEP_COUNT = 16;
