@@ -10,8 +10,8 @@
 #include "FuzzInput.h"
 #include "FuzzSession.h"
 #include "ZinMOX/ZinMOX_Core.h"
-#include "internal/ZinMOX_CoreParts.h"
 #include "ZinRT/Zin_CoreList.h"
+#include "internal/ZinMOX_CoreParts.h"
 
 using namespace ZinFuzz;
 

@@ -6,8 +6,8 @@
 #include <string>
 #include <utility>
 
-#include "internal/ZinMOX_CoreParts.h"
 #include "framework/ZinMOX_Framework.h"
+#include "internal/ZinMOX_CoreParts.h"
 
 namespace ZinRT {
 

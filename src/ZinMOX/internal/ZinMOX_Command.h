@@ -31,7 +31,9 @@ class ZinMOX_Command {
   /// Reads the whole input image (codes 03 and 04); nothing when the core has no input bits.
   void readInputs(uint32_t handle, const ZIN_CORE_REF& coreRef);
   /// Renders the text of command code 1 to 4 into `text` and returns it; other codes give the
-  /// empty text. `readBitCount`, if given, receives the bits that the text reads back.
+  /// empty text. Throws std::logic_error when the port image cannot give the output data (a
+  /// fault of the library: only '0'/'1' and 16-step strings are ever staged). `readBitCount`, if
+  /// given, receives the bits that the text reads back.
   std::string& buildCommandText(const ZIN_CORE_REF& coreRef, uint32_t code, std::string& text,
                                 uint32_t* readBitCount) const;
   /// Copies value and activity characters of the input bits out of the read bit text.
@@ -99,10 +101,9 @@ class ZinMOX_Command {
   const ZINMOX_CORE_INFO& getMoxCoreInfo() const { return moxCoreInfo; }
 
  private:
-  // D, the output data bits of the write line, concatenated.
-  std::string outputDataBits() const;
-  // Appends the hexadecimal text of D (`dataBits` characters) without building D; false when the
-  // image holds anything but '0'/'1' or irregular step strings (the caller converts D then).
+  // Appends the hexadecimal text of D, the output data bits of the write line (`dataBits` of
+  // them), without building D; false when the image holds anything but '0'/'1' or irregular
+  // step strings.
   bool appendDataHex(std::string& text, size_t dataBits) const;
 
   std::string asyncOutValueBits;

@@ -3,9 +3,9 @@
 #include <stdexcept>
 #include <string>
 
-#include "internal/ZinMOX_CoreParts.h"
 #include "ZinMOX/ZinMOX_SignalGroup.h"
 #include "framework/ZinMOX_Framework.h"
+#include "internal/ZinMOX_CoreParts.h"
 
 namespace ZinRT {
 

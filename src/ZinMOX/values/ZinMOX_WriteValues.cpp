@@ -5,9 +5,9 @@
 #include <string>
 #include <string_view>
 
-#include "internal/ZinMOX_CoreParts.h"
 #include "ZinMOX/ZinMOX_SignalGroup.h"
 #include "framework/ZinMOX_Framework.h"
+#include "internal/ZinMOX_CoreParts.h"
 #include "values/ZinMOX_HexText.h"
 
 namespace ZinRT {
