@@ -15,8 +15,8 @@ namespace ZinRT {
 
 /// The image of a core's four ports as '0'/'1' strings (character i is port bit i), and the only
 /// place where command text is built and sent. Writers call clearUpdateMasks, stage characters,
-/// then writeOutputs; readers call readInputs, then read characters. Owned by value by its core;
-/// used under the session's target lock, one thread at a time. Internal to the library.
+/// then writeOutputs; readers call readInputs, then read characters. Owned by its core (in its
+/// private parts); used under the session's target lock, one thread at a time. Internal.
 class ZinMOX_Command {
  public:
   static constexpr uint32_t STEP_COUNT = 16;
