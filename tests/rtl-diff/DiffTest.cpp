@@ -1,0 +1,217 @@
+// The RTL loopback design against the simulated target: the same random command sequences go to
+// both, and read data and output levels must be identical at every observation point.
+//
+// Observation points. The RTL's design clock runs free during scans, so the two models agree
+// only once every effect of a sequence has settled, not cycle by cycle:
+// - Write sequences (stage 01 + commit 02, or either alone) and read sequences (capture 03, then
+//   clear 04 or not, or a clear alone) stay separate, as the library sends them.
+// - After every sequence both models let enough design cycles pass for any pulse train to reach
+//   its held last step (the simulated target: `advance`; the RTL: design clock cycles with the
+//   JTAG pins still). Then the output levels are compared.
+// - Read data is compared for every capture. Because the models are settled before each read,
+//   values and activity latches (which record every change since the last clear, pulse-train
+//   steps included) must match bit for bit.
+// Status reads of both are compared once per configuration.
+//
+// ZINMOX_RTL_DIFF_SEQUENCES (default 150 per configuration) and ZINMOX_RTL_DIFF_SEED (default
+// 1) choose a longer or another run.
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <memory>
+#include <random>
+#include <string>
+#include <vector>
+
+#include "ModelPins.h"
+#include "Vloop_16_8_16_12.h"
+#include "Vloop_1_1_1_1.h"
+#include "Vloop_3_5_7_2.h"
+#include "ZinHub/HubTransport.h"
+#include "ZinSim/Target.h"
+#include "verilated.h"
+
+namespace {
+
+constexpr ZIN_CORE_REF kRef{0, 1, 0};
+constexpr uint64_t kSettleCycles = 40;  // pulse trains hold their last step after 16 cycles
+
+uint64_t envNumber(const char* name, uint64_t fallback) {
+  const char* text = std::getenv(name);
+  return text != nullptr && *text != '\0' ? std::strtoull(text, nullptr, 10) : fallback;
+}
+
+struct Widths {
+  unsigned asyncOut, syncOut, asyncIn, syncIn;
+};
+
+// The RTL side of a pair: a verilated loopback design behind the hub transport.
+class RtlLoop {
+ public:
+  virtual ~RtlLoop() = default;
+  virtual ZinRT::Zin_Transport& transport() = 0;
+  virtual std::string asyncOutputLevels() const = 0;
+  virtual std::string syncOutputLevels() const = 0;
+  virtual void runDesignCycles(uint64_t cycles) = 0;
+};
+
+template <class Value>
+std::string levelText(Value port, unsigned width) {
+  std::string text(width, '0');
+  for (unsigned i = 0; i < width; ++i) text[i] = ((uint64_t{port} >> i) & 1U) != 0 ? '1' : '0';
+  return text;
+}
+
+template <class Model>
+class VerilatedLoop final : public RtlLoop {
+ public:
+  VerilatedLoop(Widths widths, ZinRtl::ClockRatio ratio)
+      : widths_(widths), model_(&context_), pins_(model_, ratio),
+        transport_(std::make_shared<ZinHub::PinJtagEngine>(pins_)) {
+    pins_.powerOn();
+  }
+  ~VerilatedLoop() override { model_.final(); }
+
+  ZinRT::Zin_Transport& transport() override { return transport_; }
+  std::string asyncOutputLevels() const override {
+    return levelText(model_.async_out_o, widths_.asyncOut);
+  }
+  std::string syncOutputLevels() const override {
+    return levelText(model_.sync_out_o, widths_.syncOut);
+  }
+  void runDesignCycles(uint64_t cycles) override { pins_.runDesignCycles(cycles); }
+
+ private:
+  Widths widths_;
+  VerilatedContext context_;
+  Model model_;
+  ZinRtl::ModelPins<Model> pins_;
+  ZinHub::HubTransport transport_;
+};
+
+std::shared_ptr<ZinSim::Target> simTwin(Widths widths) {
+  ZinSim::CoreDescription core;
+  core.ref = kRef;
+  core.asyncOutputs = widths.asyncOut;
+  core.syncOutputs = widths.syncOut;
+  core.asyncInputs = widths.asyncIn;
+  core.syncInputs = widths.syncIn;
+  ZinSim::TargetDescription description;
+  description.cores.push_back(core);
+  return std::make_shared<ZinSim::Target>(description);
+}
+
+std::string hex8(size_t value) {
+  char text[16];
+  std::snprintf(text, sizeof text, "%08zX", value);
+  return text;
+}
+
+// Random command sequences for one core, in the library's line format.
+class SequenceSource {
+ public:
+  SequenceSource(Widths widths, uint64_t seed) : widths_(widths), random_(seed) {}
+
+  std::string stageLine() {
+    const size_t bits = 2 * widths_.asyncOut + 17 * widths_.syncOut;  // the number's low L-1 bits
+    std::string hex((bits + 3) / 4, '0');
+    for (size_t digit = 0; digit < hex.size(); ++digit) {
+      const size_t valid = std::min<size_t>(4, bits - 4 * digit);
+      const auto value = static_cast<unsigned>(random_() & ((1U << valid) - 1));
+      hex[hex.size() - 1 - digit] = "0123456789ABCDEF"[value];
+    }
+    return "00 1 0 01 0 " + hex8(bits + 1) + " " + hex;
+  }
+  static std::string commitLine() { return "00 1 0 02 0 00000004 0"; }
+  std::string captureLine() const {
+    return "00 1 0 03 1 " + hex8(4 * widths_.asyncIn + 6 * widths_.syncIn + 16) + " 0";
+  }
+  static std::string clearLine() { return "00 1 0 04 1 00000004 0"; }
+
+  // One of: stage+commit, stage, commit, capture+clear, capture, clear.
+  std::string next() {
+    switch (std::uniform_int_distribution<int>(0, 9)(random_)) {
+      case 0: case 1: case 2: case 3: return stageLine() + "\n" + commitLine();
+      case 4: return stageLine();
+      case 5: return commitLine();
+      case 6: case 7: return captureLine() + "\n" + clearLine();
+      case 8: return captureLine();
+      default: return clearLine();
+    }
+  }
+
+ private:
+  Widths widths_;
+  std::mt19937_64 random_;
+};
+
+uint32_t readBits(const std::string& sequence, Widths widths) {
+  uint32_t bits = 0;
+  if (sequence.find(" 03 ") != std::string::npos) {
+    bits += (4 * widths.asyncIn + 6 * widths.syncIn + 16 + 7) / 8 * 8;
+  }
+  if (sequence.find(" 04 ") != std::string::npos) bits += 8;
+  return bits;
+}
+
+void compareStatus(ZinRT::Zin_Transport& sim, ZinRT::Zin_Transport& rtl) {
+  ZIN_CORE_INFO simInfo{}, rtlInfo{};
+  unsigned char simStatus[16] = {}, rtlStatus[16] = {};
+  sim.readStatus(kRef, simInfo, simStatus, 16, 128);
+  rtl.readStatus(kRef, rtlInfo, rtlStatus, 16, 128);
+  EXPECT_EQ(rtlInfo.manufacturerId, simInfo.manufacturerId);
+  EXPECT_EQ(rtlInfo.coreType, simInfo.coreType);
+  EXPECT_EQ(rtlInfo.coreMajorVersion, simInfo.coreMajorVersion);
+  EXPECT_EQ(rtlInfo.coreMinorVersion, simInfo.coreMinorVersion);
+  EXPECT_EQ(rtlInfo.coreRevision, simInfo.coreRevision);
+  // The library decodes the status word from bit 40 on; bits 0..39 carry the information.
+  for (unsigned byte = 5; byte < 16; ++byte) {
+    EXPECT_EQ(rtlStatus[byte], simStatus[byte]) << "status byte " << byte;
+  }
+}
+
+void runPair(RtlLoop& rtl, Widths widths) {
+  const std::shared_ptr<ZinSim::Target> sim = simTwin(widths);
+  compareStatus(*sim, rtl.transport());
+  std::vector<ZIN_CORE_REF> cores;
+  ASSERT_TRUE(rtl.transport().listCores(cores));
+  ASSERT_EQ(cores.size(), 1U);
+
+  const uint64_t count = envNumber("ZINMOX_RTL_DIFF_SEQUENCES", 150);
+  SequenceSource source(widths, envNumber("ZINMOX_RTL_DIFF_SEED", 1));
+  for (uint64_t n = 0; n < count; ++n) {
+    const std::string sequence = source.next();
+    const uint32_t bits = readBits(sequence, widths);
+    std::vector<unsigned char> simData(bits / 8 + 1, 0), rtlData(bits / 8 + 1, 0);
+    sim->commandSequence(sequence, simData.data(), bits);
+    rtl.transport().commandSequence(sequence, rtlData.data(), bits);
+    sim->advance(kSettleCycles);
+    rtl.runDesignCycles(kSettleCycles);
+    ASSERT_EQ(rtlData, simData) << "read data after sequence " << n << ":\n" << sequence;
+    ASSERT_EQ(rtl.asyncOutputLevels(), sim->asyncOutputLevels(kRef)) << "sequence " << n;
+    ASSERT_EQ(rtl.syncOutputLevels(), sim->syncOutputLevels(kRef)) << "sequence " << n;
+  }
+}
+
+// Each configuration runs at its own clock ratio: design clock faster than TCK, slower, and
+// much faster, so the handshakes meet every phase relation.
+TEST(RtlDiff, SmallestCore) {
+  const Widths widths{1, 1, 1, 1};
+  VerilatedLoop<Vloop_1_1_1_1> rtl(widths, {7, 5});
+  runPair(rtl, widths);
+}
+
+TEST(RtlDiff, OddWidths) {
+  const Widths widths{3, 5, 7, 2};
+  VerilatedLoop<Vloop_3_5_7_2> rtl(widths, {3, 7});
+  runPair(rtl, widths);
+}
+
+TEST(RtlDiff, DemoCoreWidths) {
+  const Widths widths{16, 8, 16, 12};
+  VerilatedLoop<Vloop_16_8_16_12> rtl(widths, {13, 4});
+  runPair(rtl, widths);
+}
+
+}  // namespace
