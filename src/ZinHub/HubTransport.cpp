@@ -2,7 +2,6 @@
 #include "ZinHub/HubTransport.h"
 
 #include <algorithm>
-#include <cstring>
 #include <stdexcept>
 
 namespace ZinHub {
@@ -11,6 +10,8 @@ namespace {
 
 constexpr unsigned kDoneBit = 1;
 constexpr unsigned kRefusedBit = 2;
+constexpr unsigned kMoxCoreType = 9;
+constexpr unsigned kInfoBits = 40;  // manufacturer, type, major, minor, revision
 
 std::string lineError(size_t index, const std::string& what) {
   return "ZinHub: command line " + std::to_string(index + 1) + ": " + what;
@@ -60,11 +61,16 @@ void HubTransport::readStatus(const ZIN_CORE_REF& ref, ZIN_CORE_INFO& info, unsi
   const StatusRecord record = parseStatusReply(tdo.at(0), coreText(ref));
   if (record.info.coreType == 0) return;
   info = record.info;
-  const uint32_t bits = std::min<uint32_t>(statusBitCount, kStatusRecordBits);
-  const uint32_t bytes = std::min<uint32_t>(statusBytes, (bits + 7) / 8);
-  std::memcpy(status, record.status, bytes);
-  if (bytes == (bits + 7) / 8 && bits % 8 != 0) {
-    status[bytes - 1] &= static_cast<unsigned char>((1U << (bits % 8)) - 1);
+  // A MOX core's decoder reads the record as it is (its status from bit 40 on); a core of
+  // another type carries its own status word from record bit 40, handed up from bit 0.
+  const unsigned shift = record.info.coreType == kMoxCoreType ? 0 : kInfoBits;
+  const uint32_t bits =
+      std::min<uint32_t>({statusBitCount, kStatusRecordBits - shift, statusBytes * 8});
+  for (uint32_t i = 0; i < bits; ++i) {
+    const unsigned from = i + shift;
+    if (((record.status[from / 8] >> (from % 8)) & 1U) != 0) {
+      status[i / 8] |= static_cast<unsigned char>(1U << (i % 8));
+    }
   }
 }
 
@@ -122,12 +128,12 @@ void HubTransport::checkLine(const HubLine& line, const BitVector& tdo,
                              std::to_string(line.ref.userChainNumber));
   }
   const unsigned waitBits = board_.devices[line.ref.deviceIndex].waitBits;
+  if (capture.busy) {
+    // The hub carried out nothing of this scan.
+    throw std::runtime_error(where + " is busy: a request of an earlier scan has not completed");
+  }
   if (line.code == 1) {
-    if (capture.busy) {
-      throw std::runtime_error(where +
-                               " is busy: it refused the stage scan while a commit was "
-                               "pending");
-    }
+    return;  // its own check shows in the next scan's capture word
   } else if (line.code == 3) {
     parseCaptureReply(tdo, waitBits, line.bitLength - 16, where, readData + line.readOffset);
   } else {

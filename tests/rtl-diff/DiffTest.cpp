@@ -67,7 +67,9 @@ template <class Model>
 class VerilatedLoop final : public RtlLoop {
  public:
   VerilatedLoop(Widths widths, ZinRtl::ClockRatio ratio)
-      : widths_(widths), model_(&context_), pins_(model_, ratio),
+      : widths_(widths),
+        model_(&context_),
+        pins_(model_, ratio),
         transport_(std::make_shared<ZinHub::PinJtagEngine>(pins_)) {
     pins_.powerOn();
   }
@@ -132,12 +134,22 @@ class SequenceSource {
   // One of: stage+commit, stage, commit, capture+clear, capture, clear.
   std::string next() {
     switch (std::uniform_int_distribution<int>(0, 9)(random_)) {
-      case 0: case 1: case 2: case 3: return stageLine() + "\n" + commitLine();
-      case 4: return stageLine();
-      case 5: return commitLine();
-      case 6: case 7: return captureLine() + "\n" + clearLine();
-      case 8: return captureLine();
-      default: return clearLine();
+      case 0:
+      case 1:
+      case 2:
+      case 3:
+        return stageLine() + "\n" + commitLine();
+      case 4:
+        return stageLine();
+      case 5:
+        return commitLine();
+      case 6:
+      case 7:
+        return captureLine() + "\n" + clearLine();
+      case 8:
+        return captureLine();
+      default:
+        return clearLine();
     }
   }
 

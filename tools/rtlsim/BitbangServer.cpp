@@ -52,8 +52,8 @@ BitbangServer::BitbangServer(BitbangTarget& target, BitbangOptions options)
   ::setsockopt(listenFd_, SOL_SOCKET, SO_REUSEADDR, &yes, sizeof yes);
   if (::bind(listenFd_, reinterpret_cast<sockaddr*>(&address), sizeof address) != 0 ||
       ::listen(listenFd_, 4) != 0) {
-    const std::runtime_error error = socketError("cannot listen on " + options_.host + ":" +
-                                                 std::to_string(options_.port));
+    const std::runtime_error error =
+        socketError("cannot listen on " + options_.host + ":" + std::to_string(options_.port));
     ::close(listenFd_);
     throw error;
   }

@@ -19,7 +19,7 @@ class BitbangTarget {
 
 struct BitbangOptions {
   std::string host = "127.0.0.1";
-  uint16_t port = 9824;         // 0 picks a free port
+  uint16_t port = 9824;          // 0 picks a free port
   int idleTimeoutSeconds = 600;  // a client that sends nothing this long is dropped (0: never)
   int sendTimeoutSeconds = 10;   // a client that takes no replies this long is dropped
 };

@@ -15,7 +15,9 @@ namespace {
 
 std::atomic<bool> stopRequested{false};
 
-extern "C" void onStopSignal(int) { stopRequested = true; }
+extern "C" void onStopSignal(int) {
+  stopRequested = true;
+}
 
 void installStopHandlers() {
   struct sigaction action {};
@@ -42,8 +44,8 @@ class PinsTarget final : public ZinRtl::BitbangTarget {
 ZinRtl::ClockRatio parseRatio(const std::string& text) {
   unsigned design = 0, tck = 0;
   char tail = 0;
-  if (std::sscanf(text.c_str(), "%u/%u%c", &design, &tck, &tail) != 2 || design == 0 ||
-      tck == 0 || design > 1000 || tck > 1000) {
+  if (std::sscanf(text.c_str(), "%u/%u%c", &design, &tck, &tail) != 2 || design == 0 || tck == 0 ||
+      design > 1000 || tck > 1000) {
     throw CLI::ValidationError("--clock-ratio", "expected N/D with N and D from 1 to 1000");
   }
   return ZinRtl::ClockRatio{design, tck};
