@@ -3,7 +3,7 @@
 // bit k of the number. The image changes only during a stage scan, which the hub never runs
 // while a commit is pending, so the design domain reads it as stable data.
 module zinmox_core_stage #(
-  parameter integer IMAGE_W = 1
+  parameter integer IMAGE_W = 19
 ) (
   input  wire               tck_i,
   input  wire               tck_rst_i,
