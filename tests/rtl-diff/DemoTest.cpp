@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "ModelPins.h"
+#include "SameStatus.h"
 #include "Vzinmox_demo_top.h"
 #include "ZinHub/HubTransport.h"
 #include "ZinMOX/ZinMOX.h"
@@ -47,19 +48,7 @@ TEST(RtlDemo, SameCoresAndStatusAsTheSimulatedDemo) {
   ASSERT_EQ(rtlCores.size(), simCores.size());
   for (size_t i = 0; i < simCores.size(); ++i) {
     ASSERT_TRUE(sameRef(rtlCores[i], simCores[i])) << "core " << i;
-    ZIN_CORE_INFO simInfo{}, rtlInfo{};
-    unsigned char simStatus[16] = {}, rtlStatus[16] = {};
-    sim.readStatus(simCores[i], simInfo, simStatus, 16, 128);
-    rtl.transport->readStatus(rtlCores[i], rtlInfo, rtlStatus, 16, 128);
-    EXPECT_EQ(rtlInfo.manufacturerId, simInfo.manufacturerId) << "core " << i;
-    EXPECT_EQ(rtlInfo.coreType, simInfo.coreType) << "core " << i;
-    EXPECT_EQ(rtlInfo.coreMajorVersion, simInfo.coreMajorVersion) << "core " << i;
-    EXPECT_EQ(rtlInfo.coreMinorVersion, simInfo.coreMinorVersion) << "core " << i;
-    EXPECT_EQ(rtlInfo.coreRevision, simInfo.coreRevision) << "core " << i;
-    // A MOX core's status word is decoded from bit 40; another core's is compared whole.
-    for (unsigned byte = simInfo.coreType == 9 ? 5 : 0; byte < 16; ++byte) {
-      EXPECT_EQ(rtlStatus[byte], simStatus[byte]) << "core " << i << " byte " << byte;
-    }
+    expectSameStatus(sim, *rtl.transport, simCores[i]);
   }
 }
 

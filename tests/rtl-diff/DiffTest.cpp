@@ -25,6 +25,7 @@
 #include <vector>
 
 #include "ModelPins.h"
+#include "SameStatus.h"
 #include "Vloop_16_8_16_12.h"
 #include "Vloop_1_1_1_1.h"
 #include "Vloop_3_5_7_2.h"
@@ -110,82 +111,48 @@ std::string hex8(size_t value) {
   return text;
 }
 
-// Random command sequences for one core, in the library's line format.
+struct Sequence {
+  std::string text;
+  uint32_t readBits = 0;
+};
+
+// Random command sequences for one core, in the library's line format: stage + commit, stage,
+// commit, capture + clear, capture, or clear.
 class SequenceSource {
  public:
   SequenceSource(Widths widths, uint64_t seed) : widths_(widths), random_(seed) {}
 
+  Sequence next() {
+    const int pick = std::uniform_int_distribution<int>(0, 9)(random_);
+    const uint32_t capture = 4 * widths_.asyncIn + 6 * widths_.syncIn + 16;
+    const std::string commit = "00 1 0 02 0 00000004 0", clear = "00 1 0 04 1 00000004 0";
+    const std::string read = "00 1 0 03 1 " + hex8(capture) + " 0";
+    const uint32_t readBits = (capture + 7) / 8 * 8;
+    if (pick < 4) return {stageLine() + "\n" + commit};
+    if (pick == 4) return {stageLine()};
+    if (pick == 5) return {commit};
+    if (pick < 8) return {read + "\n" + clear, readBits + 8};
+    return pick == 8 ? Sequence{read, readBits} : Sequence{clear, 8};
+  }
+
+ private:
   std::string stageLine() {
     const size_t bits = 2 * widths_.asyncOut + 17 * widths_.syncOut;  // the number's low L-1 bits
     std::string hex((bits + 3) / 4, '0');
     for (size_t digit = 0; digit < hex.size(); ++digit) {
       const size_t valid = std::min<size_t>(4, bits - 4 * digit);
-      const auto value = static_cast<unsigned>(random_() & ((1U << valid) - 1));
-      hex[hex.size() - 1 - digit] = "0123456789ABCDEF"[value];
+      hex[hex.size() - 1 - digit] = "0123456789ABCDEF"[random_() & ((1U << valid) - 1)];
     }
     return "00 1 0 01 0 " + hex8(bits + 1) + " " + hex;
   }
-  static std::string commitLine() { return "00 1 0 02 0 00000004 0"; }
-  std::string captureLine() const {
-    return "00 1 0 03 1 " + hex8(4 * widths_.asyncIn + 6 * widths_.syncIn + 16) + " 0";
-  }
-  static std::string clearLine() { return "00 1 0 04 1 00000004 0"; }
 
-  // One of: stage+commit, stage, commit, capture+clear, capture, clear.
-  std::string next() {
-    switch (std::uniform_int_distribution<int>(0, 9)(random_)) {
-      case 0:
-      case 1:
-      case 2:
-      case 3:
-        return stageLine() + "\n" + commitLine();
-      case 4:
-        return stageLine();
-      case 5:
-        return commitLine();
-      case 6:
-      case 7:
-        return captureLine() + "\n" + clearLine();
-      case 8:
-        return captureLine();
-      default:
-        return clearLine();
-    }
-  }
-
- private:
   Widths widths_;
   std::mt19937_64 random_;
 };
 
-uint32_t readBits(const std::string& sequence, Widths widths) {
-  uint32_t bits = 0;
-  if (sequence.find(" 03 ") != std::string::npos) {
-    bits += (4 * widths.asyncIn + 6 * widths.syncIn + 16 + 7) / 8 * 8;
-  }
-  if (sequence.find(" 04 ") != std::string::npos) bits += 8;
-  return bits;
-}
-
-void compareStatus(ZinRT::Zin_Transport& sim, ZinRT::Zin_Transport& rtl) {
-  ZIN_CORE_INFO simInfo{}, rtlInfo{};
-  unsigned char simStatus[16] = {}, rtlStatus[16] = {};
-  sim.readStatus(kRef, simInfo, simStatus, 16, 128);
-  rtl.readStatus(kRef, rtlInfo, rtlStatus, 16, 128);
-  EXPECT_EQ(rtlInfo.manufacturerId, simInfo.manufacturerId);
-  EXPECT_EQ(rtlInfo.coreType, simInfo.coreType);
-  EXPECT_EQ(rtlInfo.coreMajorVersion, simInfo.coreMajorVersion);
-  EXPECT_EQ(rtlInfo.coreMinorVersion, simInfo.coreMinorVersion);
-  EXPECT_EQ(rtlInfo.coreRevision, simInfo.coreRevision);
-  // The library decodes the status word from bit 40 on; bits 0..39 carry the information.
-  for (unsigned byte = 5; byte < 16; ++byte) {
-    EXPECT_EQ(rtlStatus[byte], simStatus[byte]) << "status byte " << byte;
-  }
-}
-
 void runPair(RtlLoop& rtl, Widths widths) {
   const std::shared_ptr<ZinSim::Target> sim = simTwin(widths);
-  compareStatus(*sim, rtl.transport());
+  expectSameStatus(*sim, rtl.transport(), kRef);
   std::vector<ZIN_CORE_REF> cores;
   ASSERT_TRUE(rtl.transport().listCores(cores));
   ASSERT_EQ(cores.size(), 1U);
@@ -193,14 +160,14 @@ void runPair(RtlLoop& rtl, Widths widths) {
   const uint64_t count = envNumber("ZINMOX_RTL_DIFF_SEQUENCES", 150);
   SequenceSource source(widths, envNumber("ZINMOX_RTL_DIFF_SEED", 1));
   for (uint64_t n = 0; n < count; ++n) {
-    const std::string sequence = source.next();
-    const uint32_t bits = readBits(sequence, widths);
+    const Sequence sequence = source.next();
+    const uint32_t bits = sequence.readBits;
     std::vector<unsigned char> simData(bits / 8 + 1, 0), rtlData(bits / 8 + 1, 0);
-    sim->commandSequence(sequence, simData.data(), bits);
-    rtl.transport().commandSequence(sequence, rtlData.data(), bits);
+    sim->commandSequence(sequence.text, simData.data(), bits);
+    rtl.transport().commandSequence(sequence.text, rtlData.data(), bits);
     sim->advance(kSettleCycles);
     rtl.runDesignCycles(kSettleCycles);
-    ASSERT_EQ(rtlData, simData) << "read data after sequence " << n << ":\n" << sequence;
+    ASSERT_EQ(rtlData, simData) << "read data after sequence " << n << ":\n" << sequence.text;
     ASSERT_EQ(rtl.asyncOutputLevels(), sim->asyncOutputLevels(kRef)) << "sequence " << n;
     ASSERT_EQ(rtl.syncOutputLevels(), sim->syncOutputLevels(kRef)) << "sequence " << n;
   }

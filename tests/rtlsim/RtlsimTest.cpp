@@ -32,16 +32,16 @@ int startRtlsim(std::unique_ptr<ChildProcess>& child, std::vector<std::string> a
              : -1;
 }
 
-// Sends `data` and reads `replies` bytes back within 5 s ("" when the server does not answer).
-std::string exchange(int fd, const std::string& data, size_t replies) {
-  if (send(fd, data.data(), data.size(), MSG_NOSIGNAL) != static_cast<ssize_t>(data.size())) {
-    return "";
-  }
+// Sends `data`, then reads until `done` holds for the answer, the peer closes, or 5 s pass.
+template <class Done>
+std::string talk(int fd, const std::string& data, Done done) {
   std::string answer;
-  while (answer.size() < replies) {
-    pollfd readable{fd, POLLIN, 0};
-    char buffer[256];
-    if (poll(&readable, 1, 5000) <= 0) break;
+  if (send(fd, data.data(), data.size(), MSG_NOSIGNAL) != static_cast<ssize_t>(data.size())) {
+    return answer;
+  }
+  char buffer[512];
+  pollfd readable{fd, POLLIN, 0};
+  while (!done(answer) && poll(&readable, 1, 5000) > 0) {
     const ssize_t n = recv(fd, buffer, sizeof buffer, 0);
     if (n <= 0) break;
     answer.append(buffer, static_cast<size_t>(n));
@@ -49,22 +49,15 @@ std::string exchange(int fd, const std::string& data, size_t replies) {
   return answer;
 }
 
+std::string exchange(int fd, const std::string& data, size_t replies) {
+  return talk(fd, data, [replies](const std::string& a) { return a.size() >= replies; });
+}
+
 // One command through OpenOCD's Tcl server: the text, then byte 0x1a; the reply ends with 0x1a.
 std::string tcl(int fd, const std::string& command) {
-  const std::string frame = command + '\x1a';
-  if (send(fd, frame.data(), frame.size(), MSG_NOSIGNAL) != static_cast<ssize_t>(frame.size())) {
-    return "(send failed)";
-  }
-  std::string answer;
-  while (answer.empty() || answer.back() != '\x1a') {
-    pollfd readable{fd, POLLIN, 0};
-    char buffer[512];
-    if (poll(&readable, 1, 10000) <= 0) return answer + "(timeout)";
-    const ssize_t n = recv(fd, buffer, sizeof buffer, 0);
-    if (n <= 0) return answer + "(closed)";
-    answer.append(buffer, static_cast<size_t>(n));
-  }
-  answer.pop_back();
+  std::string answer = talk(fd, command + '\x1a',
+                            [](const std::string& a) { return !a.empty() && a.back() == '\x1a'; });
+  if (!answer.empty()) answer.pop_back();
   return answer;
 }
 
