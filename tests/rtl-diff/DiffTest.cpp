@@ -47,51 +47,12 @@ struct Widths {
   unsigned asyncOut, syncOut, asyncIn, syncIn;
 };
 
-// The RTL side of a pair: a verilated loopback design behind the hub transport.
-class RtlLoop {
- public:
-  virtual ~RtlLoop() = default;
-  virtual ZinRT::Zin_Transport& transport() = 0;
-  virtual std::string asyncOutputLevels() const = 0;
-  virtual std::string syncOutputLevels() const = 0;
-  virtual void runDesignCycles(uint64_t cycles) = 0;
-};
-
 template <class Value>
 std::string levelText(Value port, unsigned width) {
   std::string text(width, '0');
   for (unsigned i = 0; i < width; ++i) text[i] = ((uint64_t{port} >> i) & 1U) != 0 ? '1' : '0';
   return text;
 }
-
-template <class Model>
-class VerilatedLoop final : public RtlLoop {
- public:
-  VerilatedLoop(Widths widths, ZinRtl::ClockRatio ratio)
-      : widths_(widths),
-        model_(&context_),
-        pins_(model_, ratio),
-        transport_(std::make_shared<ZinHub::PinJtagEngine>(pins_)) {
-    pins_.powerOn();
-  }
-  ~VerilatedLoop() override { model_.final(); }
-
-  ZinRT::Zin_Transport& transport() override { return transport_; }
-  std::string asyncOutputLevels() const override {
-    return levelText(model_.async_out_o, widths_.asyncOut);
-  }
-  std::string syncOutputLevels() const override {
-    return levelText(model_.sync_out_o, widths_.syncOut);
-  }
-  void runDesignCycles(uint64_t cycles) override { pins_.runDesignCycles(cycles); }
-
- private:
-  Widths widths_;
-  VerilatedContext context_;
-  Model model_;
-  ZinRtl::ModelPins<Model> pins_;
-  ZinHub::HubTransport transport_;
-};
 
 std::shared_ptr<ZinSim::Target> simTwin(Widths widths) {
   ZinSim::CoreDescription core;
@@ -150,11 +111,19 @@ class SequenceSource {
   std::mt19937_64 random_;
 };
 
-void runPair(RtlLoop& rtl, Widths widths) {
+// One configuration: the verilated loopback design behind the hub transport over the pin-level
+// engine, against its simulated twin.
+template <class Model>
+void runPair(Widths widths, ZinRtl::ClockRatio ratio) {
+  VerilatedContext context;
+  Model model(&context);
+  ZinRtl::ModelPins<Model> pins(model, ratio);
+  pins.powerOn();
+  ZinHub::HubTransport rtl(std::make_shared<ZinHub::PinJtagEngine>(pins));
   const std::shared_ptr<ZinSim::Target> sim = simTwin(widths);
-  expectSameStatus(*sim, rtl.transport(), kRef);
+  expectSameStatus(*sim, rtl, kRef);
   std::vector<ZIN_CORE_REF> cores;
-  ASSERT_TRUE(rtl.transport().listCores(cores));
+  ASSERT_TRUE(rtl.listCores(cores));
   ASSERT_EQ(cores.size(), 1U);
 
   const uint64_t count = envNumber("ZINMOX_RTL_DIFF_SEQUENCES", 150);
@@ -164,33 +133,28 @@ void runPair(RtlLoop& rtl, Widths widths) {
     const uint32_t bits = sequence.readBits;
     std::vector<unsigned char> simData(bits / 8 + 1, 0), rtlData(bits / 8 + 1, 0);
     sim->commandSequence(sequence.text, simData.data(), bits);
-    rtl.transport().commandSequence(sequence.text, rtlData.data(), bits);
+    rtl.commandSequence(sequence.text, rtlData.data(), bits);
     sim->advance(kSettleCycles);
-    rtl.runDesignCycles(kSettleCycles);
+    pins.runDesignCycles(kSettleCycles);
     ASSERT_EQ(rtlData, simData) << "read data after sequence " << n << ":\n" << sequence.text;
-    ASSERT_EQ(rtl.asyncOutputLevels(), sim->asyncOutputLevels(kRef)) << "sequence " << n;
-    ASSERT_EQ(rtl.syncOutputLevels(), sim->syncOutputLevels(kRef)) << "sequence " << n;
+    ASSERT_EQ(levelText(model.async_out_o, widths.asyncOut), sim->asyncOutputLevels(kRef))
+        << "sequence " << n;
+    ASSERT_EQ(levelText(model.sync_out_o, widths.syncOut), sim->syncOutputLevels(kRef))
+        << "sequence " << n;
   }
+  model.final();
 }
 
 // Each configuration runs at its own clock ratio: design clock faster than TCK, slower, and
 // much faster, so the handshakes meet every phase relation.
 TEST(RtlDiff, SmallestCore) {
-  const Widths widths{1, 1, 1, 1};
-  VerilatedLoop<Vloop_1_1_1_1> rtl(widths, {7, 5});
-  runPair(rtl, widths);
+  runPair<Vloop_1_1_1_1>({1, 1, 1, 1}, {7, 5});
 }
-
 TEST(RtlDiff, OddWidths) {
-  const Widths widths{3, 5, 7, 2};
-  VerilatedLoop<Vloop_3_5_7_2> rtl(widths, {3, 7});
-  runPair(rtl, widths);
+  runPair<Vloop_3_5_7_2>({3, 5, 7, 2}, {3, 7});
 }
-
 TEST(RtlDiff, DemoCoreWidths) {
-  const Widths widths{16, 8, 16, 12};
-  VerilatedLoop<Vloop_16_8_16_12> rtl(widths, {13, 4});
-  runPair(rtl, widths);
+  runPair<Vloop_16_8_16_12>({16, 8, 16, 12}, {13, 4});
 }
 
 }  // namespace
