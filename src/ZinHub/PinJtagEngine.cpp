@@ -56,7 +56,6 @@ std::vector<BitVector> PinJtagEngine::execute() {
 void PinJtagEngine::walk(std::initializer_list<bool> tms) {
   for (bool level : tms) {
     pins_.clock(level, false);
-    ++cycles_;
   }
 }
 
@@ -65,7 +64,6 @@ BitVector PinJtagEngine::shift(const BitVector& tdi) {
   for (size_t i = 0; i < tdi.size(); ++i) {
     // The last bit leaves Shift for Exit1.
     tdo[i] = pins_.clock(i + 1 == tdi.size(), tdi[i] != 0) ? 1 : 0;
-    ++cycles_;
   }
   return tdo;
 }

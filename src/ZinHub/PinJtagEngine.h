@@ -30,9 +30,6 @@ class PinJtagEngine : public JtagEngine {
   void queueDrScan(uint32_t device, BitVector tdi) override;
   std::vector<BitVector> execute() override;
 
-  /// TCK cycles driven so far.
-  uint64_t tckCycles() const { return cycles_; }
-
  private:
   struct Scan {
     bool ir = false;
@@ -44,7 +41,6 @@ class PinJtagEngine : public JtagEngine {
   JtagPins& pins_;
   std::vector<Scan> queue_;
   bool idle_ = false;
-  uint64_t cycles_ = 0;
 };
 
 }  // namespace ZinHub

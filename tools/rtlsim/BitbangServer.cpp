@@ -79,7 +79,8 @@ bool BitbangServer::run(const std::atomic<bool>& stop) {
     std::fprintf(stderr, "zinmox-rtlsim: client connected\n");
     const bool quit = serveClient(fd, stop);
     ::close(fd);
-    std::fprintf(stderr, "zinmox-rtlsim: client %s\n", quit ? "quit" : "left");
+    std::fprintf(stderr, "zinmox-rtlsim: client %s (%llu unknown bytes ignored so far)\n",
+                 quit ? "quit" : "left", static_cast<unsigned long long>(ignored_));
     if (quit) return true;
   }
   return false;

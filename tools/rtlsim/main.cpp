@@ -70,10 +70,15 @@ int main(int argc, char** argv) {
   app.add_option("--clock-ratio", ratio,
                  "design clock half cycles per TCK half period, N/D (the clocks run free)")
       ->capture_default_str();
-  CLI11_PARSE(app, argc, argv);
+  ZinRtl::ClockRatio clockRatio;
+  try {
+    app.parse(argc, argv);
+    clockRatio = parseRatio(ratio);
+  } catch (const CLI::ParseError& e) {
+    return app.exit(e) == 0 ? 0 : 2;  // --help, or a usage error (status 2, like zinmox)
+  }
 
   try {
-    const ZinRtl::ClockRatio clockRatio = parseRatio(ratio);
     auto context = std::make_unique<VerilatedContext>();
     auto model = std::make_unique<Vzinmox_demo_top>(context.get());
     DemoPins pins(*model, clockRatio);
@@ -87,8 +92,6 @@ int main(int argc, char** argv) {
     model->final();
     std::printf("zinmox-rtlsim: stopped (%s)\n", quit ? "client quit" : "signal");
     return 0;
-  } catch (const CLI::Error& e) {
-    return app.exit(e);
   } catch (const std::exception& e) {
     std::fprintf(stderr, "zinmox-rtlsim: %s\n", e.what());
     return 1;
