@@ -9,7 +9,7 @@ module zinmox_demo_top (
   input  wire trst_ni,
   output wire tdo_o
 );
-  localparam integer LEN_W = 24;
+  localparam integer LEN_W = 9;  // the longest scan: 16 + 169 + 16 bits
   localparam integer CORES = 4;
 
   /* verilator lint_off UNUSEDSIGNAL */

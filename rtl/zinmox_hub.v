@@ -60,7 +60,7 @@ module zinmox_hub #(
   reg              spare_bad_q;
   reg              stage_bad_q;
   wire [CORES-1:0] req_q;
-  reg  [1:0]       op_q;
+  reg  [1:0]       op_q = 2'd0;  // changes only at a launch, never while a request is up
   reg              done_q;
   reg              refused_q;
 
@@ -164,7 +164,6 @@ module zinmox_hub #(
       busy_cap_q  <= 1'b0;
       spare_bad_q <= 1'b0;
       stage_bad_q <= 1'b0;
-      op_q        <= 2'd0;
       refused_q   <= 1'b0;
     end else if (do_capture) begin
       hdr_q      <= 1'b1;
@@ -243,17 +242,18 @@ module zinmox_hub #(
     end
   end
 
-  // Requests: one at a time; the request of core k stays up until its acknowledge arrives.
+  // Requests: one at a time; the request of core k stays up until its acknowledge arrives, also
+  // across a TAP reset, so the op never changes under a design side that may have seen the
+  // request. The request flops start at 0 from the device configuration.
   wire launch = hdr_end && key_ok && cmd_ok && (hdr_op == 4'd2 || hdr_op == 4'd3 ||
                 hdr_op == 4'd4) && !(hdr_op == 4'd2 && !hdr_valid);
   genvar c;
   generate
     for (c = 0; c < CORES; c = c + 1) begin : g_req
       localparam [3:0] Index = c;
-      reg req_c_q;
+      reg req_c_q = 1'b0;
       always @(posedge tck_i) begin
-        if (reset_i) req_c_q <= 1'b0;
-        else if (launch && hdr_core == Index) req_c_q <= 1'b1;
+        if (launch && hdr_core == Index) req_c_q <= 1'b1;
         else if (ack_i[c]) req_c_q <= 1'b0;
       end
       assign req_q[c] = req_c_q;

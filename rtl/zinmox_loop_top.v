@@ -19,7 +19,21 @@ module zinmox_loop_top #(
   output wire [ASYNC_OUT_W-1:0] async_out_o,
   output wire [SYNC_OUT_W-1:0]  sync_out_o
 );
-  localparam integer LEN_W = 24;
+  // Bit counters of the hub: wide enough for the longest stage or capture scan plus its CRC and
+  // one more, so that a scan of the wrong length never looks right.
+  localparam integer STAGE_LEN = 2 * ASYNC_OUT_W + 17 * SYNC_OUT_W + 1;
+  localparam integer CAP_LEN   = 4 * ASYNC_IN_W + 6 * SYNC_IN_W;
+  localparam integer MAX_LEN   = STAGE_LEN > CAP_LEN ? STAGE_LEN : CAP_LEN;
+  localparam integer LEN_W     = clog2((MAX_LEN > 128 ? MAX_LEN : 128) + 18);
+
+  function integer clog2;
+    input integer value;
+    integer v;
+    begin
+      clog2 = 1;
+      for (v = 2; v < value; v = v * 2) clog2 = clog2 + 1;
+    end
+  endfunction
 
   /* verilator lint_off UNUSEDSIGNAL */
   wire [3:0] user_sel;  // only USER1 carries a hub
