@@ -64,10 +64,10 @@ void HubTransport::readStatus(const ZIN_CORE_REF& ref, ZIN_CORE_INFO& info, unsi
   // A MOX core's decoder reads the record as it is (its status from bit 40 on); a core of
   // another type carries its own status word from record bit 40, handed up from bit 0.
   const unsigned shift = record.info.coreType == kMoxCoreType ? 0 : kInfoBits;
-  const uint32_t bits =
-      std::min<uint32_t>({statusBitCount, kStatusRecordBits - shift, statusBytes * 8});
-  for (uint32_t i = 0; i < bits; ++i) {
-    const unsigned from = i + shift;
+  const uint64_t bits = std::min<uint64_t>(
+      {statusBitCount, kStatusRecordBits - shift, uint64_t{statusBytes} * 8});
+  for (uint64_t i = 0; i < bits; ++i) {
+    const uint64_t from = i + shift;
     if (((record.status[from / 8] >> (from % 8)) & 1U) != 0) {
       status[i / 8] |= static_cast<unsigned char>(1U << (i % 8));
     }
