@@ -44,6 +44,12 @@ check_top() {
 for file in "${rtl[@]}"; do check_top "$(basename "$file" .v)" "${rtl[*]}"; done
 for file in "$root"/rtl/vendor/zinmox_*.v; do check_top "$(basename "$file" .v)" "${vendor[*]}"; done
 
+# The vendor wrappers through their family's synthesis, the primitive kept as a black box.
+run_yosys synth_bscane2 "read_verilog ${vendor[*]}; synth_xilinx -flatten -top zinmox_bscane2; \
+  select -assert-count 1 t:BSCANE2"
+run_yosys synth_jtagg "read_verilog ${vendor[*]}; synth_ecp5 -top zinmox_jtagg; \
+  select -assert-count 1 t:JTAGG"
+
 # Sums the cells of a stat report whose names match a pattern.
 count() { awk -v re="$2" '$1 ~ re { n += $2 } END { print n + 0 }' "$1"; }
 
@@ -108,6 +114,10 @@ if [ -f ice40_8.json ]; then
       printf "iCE40 HX8K %-5s Fmax %7s MHz (goal %s MHz)\n" "$name" "${mhz:-?}" "$goal"
       awk -v m="${mhz:-0}" -v g="$goal" 'BEGIN { exit !(m >= g) }' || fail "$name below $goal MHz"
     done
+    # TDO is taken on the falling TCK edge: the path from TCK to the TDO pin gets half a period.
+    ns=$(grep -E "Max delay posedge tck_i.* -> <async>" pnr.log | tail -1 | sed -E 's/.*: ([0-9.]+) ns.*/\1/')
+    printf "iCE40 HX8K TCK to TDO pin %6s ns (at most 16.6 ns, half a period at 30 MHz)\n" "${ns:-?}"
+    awk -v n="${ns:-99}" 'BEGIN { exit !(n <= 16.6) }' || fail "TCK to TDO too slow"
   else
     fail "nextpnr-ice40 failed (see $work/pnr.log)"
   fi

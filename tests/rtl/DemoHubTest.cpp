@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <random>
+#include <string>
 
 #include "HubClient.h"
 #include "Vzinmox_demo_top.h"
@@ -211,9 +212,15 @@ TEST_P(DemoHubRatio, RoundTripOnEveryCore) {
   }
 }
 
+std::string ratioName(const ::testing::TestParamInfo<ClockPlan>& info) {
+  static const char* const names[] = {"TckFaster", "TckSlower", "Jitter7to3", "Jitter3to7"};
+  return names[info.index];
+}
+
 INSTANTIATE_TEST_SUITE_P(Clocks, DemoHubRatio,
                          ::testing::Values(ClockPlan{1, 13, 0, 1}, ClockPlan{13, 1, 0, 2},
-                                           ClockPlan{7, 3, 0.3, 3}, ClockPlan{3, 7, 0.3, 4}));
+                                           ClockPlan{7, 3, 0.3, 3}, ClockPlan{3, 7, 0.3, 4}),
+                         ratioName);
 
 }  // namespace
 }  // namespace RtlTest

@@ -4,6 +4,7 @@
 
 #include <cstdint>
 #include <functional>
+#include <ostream>
 #include <random>
 #include <vector>
 
@@ -18,6 +19,9 @@ struct ClockPlan {
   double jitter = 0;
   uint32_t seed = 1;
 };
+inline void PrintTo(const ClockPlan& p, std::ostream* os) {
+  *os << "TCK " << p.tckPeriod << ", clock " << p.clkPeriod << ", jitter " << p.jitter;
+}
 
 template <class Model>
 class PinBench {
