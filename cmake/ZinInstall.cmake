@@ -1,13 +1,14 @@
 # Installation: libraries, the public include tree, a CMake package and a pkg-config file.
 include(CMakePackageConfigHelpers)
 
-install(TARGETS ZinUtil ZinJtag ZinCore ZinMOX ZinSim ZinNet EXPORT ZinMOXTargets
+install(TARGETS ZinUtil ZinJtag ZinCore ZinMOX ZinSim ZinNet ZinOpenOcd EXPORT ZinMOXTargets
   LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}
   ARCHIVE DESTINATION ${CMAKE_INSTALL_LIBDIR}
   RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR}
   INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ZinRT ${PROJECT_SOURCE_DIR}/include/ZinMOX
   ${PROJECT_SOURCE_DIR}/include/ZinSim ${PROJECT_SOURCE_DIR}/include/ZinNet
+  ${PROJECT_SOURCE_DIR}/include/ZinOpenOcd
   DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
 
 set(ZIN_CMAKE_DIR ${CMAKE_INSTALL_LIBDIR}/cmake/ZinMOX)

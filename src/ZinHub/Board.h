@@ -5,6 +5,7 @@
 
 #include <cstdint>
 #include <map>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -17,6 +18,8 @@ struct BoardDevice {
   uint32_t irLength = 4;                           // bits in the TAP's instruction register
   std::map<uint32_t, uint64_t> chainInstructions;  // user chain number -> instruction
   unsigned waitBits = kDefaultWaitBits;            // W: TCK cycles a hub may take to answer
+  std::optional<uint32_t> idcode;                  // checked where a debugger reports it
+  uint32_t idcodeMask = 0xFFFFFFFF;                // the IDCODE bits that must match
 };
 
 /// Device index i is `devices[i]`, counted along the chain.

@@ -4,6 +4,8 @@
 #include <optional>
 
 #include "Errors.h"
+#include "ZinHub/BoardFile.h"
+#include "ZinHub/OpenOcdTarget.h"
 #include "ZinNet/Endpoint.h"
 #include "ZinNet/TcpTransport.h"
 #include "ZinSim/Description.h"
@@ -22,10 +24,26 @@ std::optional<ZinNet::Endpoint> tcpEndpoint(const std::string& targetText) {
   }
 }
 
+// The OpenOCD target of an "openocd://HOST:PORT" text, or nothing.
+std::optional<ZinHub::OpenOcdTarget> openOcdTarget(const std::string& targetText) {
+  try {
+    return ZinHub::parseOpenOcdTarget(targetText);
+  } catch (const std::invalid_argument& error) {
+    throw UsageError(error.what());
+  }
+}
+
 }  // namespace
 
 std::shared_ptr<ZinRT::Zin_Transport> openTarget(const std::string& targetText) {
   if (targetText.empty()) return std::make_shared<ZinSim::Target>();
+  if (const auto openocd = openOcdTarget(targetText)) {
+    try {
+      return ZinHub::openOpenOcd(*openocd);
+    } catch (const std::runtime_error& error) {
+      throw Failure(error.what());
+    }
+  }
   if (const std::optional<ZinNet::Endpoint> server = tcpEndpoint(targetText)) {
     auto transport = std::make_shared<ZinNet::TcpTransport>(*server);
     try {
@@ -44,6 +62,9 @@ std::shared_ptr<ZinRT::Zin_Transport> openTarget(const std::string& targetText) 
 
 std::string describeTarget(const std::string& targetText) {
   if (targetText.empty()) return "the built-in demo design";
+  if (const auto openocd = openOcdTarget(targetText)) {
+    return ZinHub::describeOpenOcdTarget(*openocd);
+  }
   if (const std::optional<ZinNet::Endpoint> server = tcpEndpoint(targetText)) {
     return "the target server at " + server->text();
   }
