@@ -67,7 +67,8 @@ void bindSession(py::module_& module) {
       module, "Session",
       "A JTAG session on a target.\n\n"
       "target: None for the built-in simulated demo design, the path of a target description "
-      "file, \"tcp://HOST:PORT\" of a target server (zinmox serve), or a dict in the description "
+      "file, \"tcp://HOST:PORT\" of a target server (zinmox serve), \"openocd://HOST:PORT\" of "
+      "OpenOCD's Tcl port, or a dict in the description "
       "format. A context manager: leaving the with block "
       "closes the session.")
       .def(py::init([](const py::object& target) {

@@ -3,6 +3,8 @@
 
 #include <optional>
 
+#include "ZinHub/BoardFile.h"
+#include "ZinHub/OpenOcdTarget.h"
 #include "ZinNet/Endpoint.h"
 #include "ZinNet/TcpTransport.h"
 #include "ZinSim/Description.h"
@@ -51,8 +53,32 @@ TransportChoice fromServer(const std::string& url) {
   return choice;
 }
 
+// "openocd://HOST:PORT[?board=...]": a board behind OpenOCD, connected and checked at once
+// (ConnectionError when unreachable or not matching the board; ValueError for a bad text or
+// board file).
+TransportChoice fromOpenOcd(const std::string& url) {
+  std::optional<ZinHub::OpenOcdTarget> target;
+  try {
+    target = ZinHub::parseOpenOcdTarget(url);
+  } catch (const std::invalid_argument& error) {
+    throw py::value_error(error.what());
+  }
+  TransportChoice choice;
+  try {
+    choice.transport = ZinHub::openOpenOcd(*target);
+  } catch (const ZinHub::BoardError& error) {
+    throw py::value_error(error.what());
+  } catch (const std::runtime_error& error) {
+    PyErr_SetString(PyExc_ConnectionError, error.what());
+    throw py::error_already_set();
+  }
+  choice.description = ZinHub::describeOpenOcdTarget(*target);
+  return choice;
+}
+
 TransportChoice fromPath(const std::string& path) {
   if (path.rfind("tcp://", 0) == 0) return fromServer(path);
+  if (path.rfind("openocd://", 0) == 0) return fromOpenOcd(path);
   try {
     return fromDescription(ZinSim::loadDescription(path), "description file " + path);
   } catch (const ZinSim::DescriptionError& error) {

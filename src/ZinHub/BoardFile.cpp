@@ -61,8 +61,9 @@ std::string tapName(const json& value, const std::string& origin, const std::str
   if (!value.is_string()) fail(origin, where, "expected a text");
   const std::string name = value.get<std::string>();
   const bool ok = !name.empty() && name.size() <= 128 &&
-                  name.find_first_not_of("abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ"
-                                         "0123456789_.-") == std::string::npos;
+                  name.find_first_not_of(
+                      "abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ"
+                      "0123456789_.-") == std::string::npos;
   if (!ok) fail(origin, where, "a TAP name of letters, digits, '_', '.' and '-'");
   return name;
 }
@@ -92,7 +93,8 @@ void readChains(const json& chains, BoardDevice& device, const std::string& orig
   for (const auto& [key, value] : chains.items()) {
     const std::string at = where + "." + key;
     const uint64_t chain = number(json(key), origin, at + " (the chain number)", kMaxChain);
-    const uint64_t max = device.irLength >= 64 ? ~uint64_t{0} : (uint64_t{1} << device.irLength) - 1;
+    const uint64_t max =
+        device.irLength >= 64 ? ~uint64_t{0} : (uint64_t{1} << device.irLength) - 1;
     device.chainInstructions[static_cast<uint32_t>(chain)] = number(value, origin, at, max);
   }
 }
@@ -124,8 +126,9 @@ BoardDevice readDevice(const json& entry, const std::string& origin, const std::
     } else if (key == "idcode_mask") {
       device.idcodeMask = static_cast<uint32_t>(number(value, origin, at, 0xFFFFFFFF));
     } else if (key != "chains") {
-      fail(origin, at, "unknown key (preset, tap, ir_length, chains, wait_bits, idcode, "
-                       "idcode_mask)");
+      fail(origin, at,
+           "unknown key (preset, tap, ir_length, chains, wait_bits, idcode, "
+           "idcode_mask)");
     }
   }
   if (entry.contains("chains")) readChains(entry["chains"], device, origin, where + ".chains");

@@ -111,15 +111,14 @@ void OpenOcdEngine::checkBoard(const std::string& scanChain) const {
       if (t[1] == device.tapName) tap = &t;
     }
     if (tap == nullptr) {
-      throw std::runtime_error("ZinHub: " + where() + " has no TAP named " + device.tapName +
-                               " (" + name + ")");
+      throw std::runtime_error("ZinHub: " + where() + " has no TAP named " + device.tapName + " (" +
+                               name + ")");
     }
     const unsigned long irLength = std::strtoul(std::string((*tap)[5]).c_str(), nullptr, 10);
     if (irLength != device.irLength) {
       throw std::runtime_error("ZinHub: " + name + " has IR length " +
                                std::to_string(device.irLength) + ", but " + where() +
-                               " declares IR length " + std::to_string(irLength) +
-                               " for that TAP");
+                               " declares IR length " + std::to_string(irLength) + " for that TAP");
     }
     if (!device.idcode) continue;
     const uint32_t found =
@@ -137,7 +136,8 @@ void OpenOcdEngine::queueIrScan(uint32_t device, uint32_t irLength, uint64_t ins
     throw std::invalid_argument("no device " + std::to_string(device) + " on the board");
   }
   if (irLength != board_.devices[device].irLength) {
-    throw std::invalid_argument("IR length " + std::to_string(irLength) + " does not match the board");
+    throw std::invalid_argument("IR length " + std::to_string(irLength) +
+                                " does not match the board");
   }
   queue_.push_back(Scan{device, true, instruction, {}});
 }
@@ -220,12 +220,13 @@ void OpenOcdEngine::runRequest(const std::vector<const Scan*>& scans,
     if (why.empty()) why = "OpenOCD reports no reason; see its log";
     throw std::runtime_error("ZinHub: " + where() +
                              " could not carry out the scans (has it lost the cable or the "
-                             "target?): " + why);
+                             "target?): " +
+                             why);
   }
   if (answer.rfind(kOk, 0) != 0) {
     connection_.close();
-    throw std::runtime_error("ZinHub: " + where() + " gave an unexpected answer: " +
-                             answer.substr(0, 200));
+    throw std::runtime_error("ZinHub: " + where() +
+                             " gave an unexpected answer: " + answer.substr(0, 200));
   }
   std::string_view rest = std::string_view(answer).substr(std::string(kOk).size());
   for (const Scan* scan : scans) {
@@ -238,7 +239,8 @@ void OpenOcdEngine::runRequest(const std::vector<const Scan*>& scans,
     tdo.reserve(scan->tdi.size());
     bool ok = end != std::string_view::npos && fields.size() == expected;
     for (size_t f = 0; ok && f < expected; ++f) {
-      ok = appendField(tdo, fields[f], std::min<size_t>(kFieldBits, scan->tdi.size() - f * kFieldBits));
+      ok = appendField(tdo, fields[f],
+                       std::min<size_t>(kFieldBits, scan->tdi.size() - f * kFieldBits));
     }
     if (!ok) {
       connection_.close();

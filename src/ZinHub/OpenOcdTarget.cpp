@@ -20,8 +20,7 @@ constexpr uint32_t kMaxTimeoutMs = 3600000;
 uint32_t decimal(const std::string& text, const std::string& digits, uint32_t max,
                  const char* what) {
   if (digits.empty() || digits.size() > 10 ||
-      digits.find_first_not_of("0123456789") != std::string::npos ||
-      std::stoull(digits) > max) {
+      digits.find_first_not_of("0123456789") != std::string::npos || std::stoull(digits) > max) {
     malformed(text, std::string(what) + " must be a number from 1 to " + std::to_string(max));
   }
   return static_cast<uint32_t>(std::stoull(digits));
@@ -69,8 +68,7 @@ std::optional<OpenOcdTarget> parseOpenOcdTarget(const std::string& text) {
                                     "0123456789.-:") != std::string::npos) {
     malformed(text, "bad host");
   }
-  target.port =
-      static_cast<uint16_t>(decimal(text, address.substr(colon + 1), 65535, "the port"));
+  target.port = static_cast<uint16_t>(decimal(text, address.substr(colon + 1), 65535, "the port"));
   if (target.port == 0) malformed(text, "the port must be a number from 1 to 65535");
   if (question != std::string::npos) readOptions(text, rest.substr(question + 1), target);
   return target;

@@ -20,8 +20,8 @@ namespace ZinHub {
 struct OpenOcdTarget {
   std::string host;
   uint16_t port = 0;
-  std::string board;        // as loadBoard takes it
-  uint32_t timeoutMs = 0;   // 0: the defaults of OpenOcdOptions
+  std::string board;       // as loadBoard takes it
+  uint32_t timeoutMs = 0;  // 0: the defaults of OpenOcdOptions
 };
 
 /// Nothing when `text` does not start with "openocd://"; throws std::invalid_argument when it

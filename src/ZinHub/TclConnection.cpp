@@ -43,7 +43,9 @@ bool waitFor(int fd, short events, Clock::time_point deadline) {
 TclConnection::TclConnection(std::string host, uint16_t port, OpenOcdOptions options)
     : host_(std::move(host)), port_(port), options_(options) {}
 
-TclConnection::~TclConnection() { close(); }
+TclConnection::~TclConnection() {
+  close();
+}
 
 std::string TclConnection::where() const {
   const bool v6 = host_.find(':') != std::string::npos;
@@ -129,7 +131,8 @@ std::string TclConnection::request(const std::string& script, size_t maxAnswer) 
   std::string answer;
   char buffer[65536];
   while (answer.empty() || answer.back() != kEnd) {
-    if (answer.size() > maxAnswer) fail("answer longer than " + std::to_string(maxAnswer) + " bytes");
+    if (answer.size() > maxAnswer)
+      fail("answer longer than " + std::to_string(maxAnswer) + " bytes");
     if (!waitFor(fd_, POLLIN, deadline)) fail(late);
     const ssize_t n = recv(fd_, buffer, sizeof buffer, 0);
     if (n == 0) fail("OpenOCD closed the connection (did it stop?)");

@@ -44,9 +44,10 @@ const std::vector<DemoStep>& tour() {
   return steps;
 }
 
-void runTour() {
-  Session session;
-  std::cout << "zinmox demo: a tour of the simulated demo design (device 0, user chain 1).\n"
+void runTour(const std::string& target) {
+  Session session(target);
+  std::cout << "zinmox demo: a tour of the " << (target.empty() ? "simulated" : "RTL")
+            << " demo design (device 0, user chain 1).\n"
                "Each step shows the command, then what it prints.\n";
   int number = 1;
   for (const DemoStep& step : tour()) {
@@ -63,14 +64,19 @@ void runTour() {
 }  // namespace
 
 void addDemoCommand(CLI::App& app, Session& session) {
-  CLI::App* command =
-      app.add_subcommand("demo", "A short guided tour on the built-in simulated demo design");
+  CLI::App* command = app.add_subcommand("demo",
+                                         "A short guided tour on the built-in simulated demo "
+                                         "design (or the RTL model behind OpenOCD)");
   command->callback([&session] {
     if (session.inScript()) throw UsageError("demo cannot be used inside a script");
-    if (!session.targetText().empty()) {
-      throw UsageError("demo always runs on the built-in demo design; leave out --target");
+    // The RTL model behind OpenOCD is the same demo design, so the tour runs there too.
+    const std::string& target = session.targetText();
+    if (!target.empty() && target.rfind("openocd://", 0) != 0) {
+      throw UsageError(
+          "demo runs on the built-in demo design or on the RTL model behind OpenOCD "
+          "(--target openocd://HOST:PORT); leave out --target");
     }
-    runTour();
+    runTour(target);
   });
 }
 

@@ -1,0 +1,294 @@
+// The hub transport through OpenOCD and zinmox-rtlsim: the exported functions give the simulated
+// target's results, and every fault (no OpenOCD, OpenOCD or the model dying mid-call, a board
+// that does not match, an empty chain, a corrupted scan, a silent server) is a clear error.
+#include <gtest/gtest.h>
+#include <netinet/in.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+#include <future>
+#include <map>
+#include <sstream>
+#include <thread>
+
+#include "OpenOcdRig.h"
+#include "ZinHub/BoardFile.h"
+#include "ZinHub/OpenOcdTarget.h"
+#include "ZinMOX/ZinMOX.h"
+#include "ZinOpenOcd/ZinOpenOcd.h"
+#include "ZinRT/ZinJtag.h"
+#include "ZinSim/Target.h"
+
+namespace ZinRtlTest {
+namespace {
+
+using ZinRT::ZinMOX_ValueMap;
+
+ZinHub::OpenOcdTarget parse(const std::string& text) {
+  return *ZinHub::parseOpenOcdTarget(text);
+}
+
+template <class F>
+std::string errorOf(F&& call) {
+  try {
+    call();
+  } catch (const std::exception& e) {
+    return e.what();
+  }
+  return "(no error)";
+}
+
+// One session and the messages of its last failed call.
+struct Host {
+  uint32_t handle = 0;
+  std::string messages;
+  explicit Host(uint32_t h) : handle(h) {
+    ZinJtag_setMessageHandler(
+        handle,
+        [](void* self, uint32_t, uint32_t, const char* text) {
+          static_cast<Host*>(self)->messages += std::string(text) + "\n";
+        },
+        this);
+  }
+  ~Host() { ZinJtag_closeSession(handle); }
+
+  std::string text(uint32_t rc, const ZinMOX_ValueMap& values) {
+    std::ostringstream out;
+    out << "rc " << rc;
+    for (const auto& [key, value] : values) out << " " << key << "=" << value;
+    return out.str();
+  }
+  std::string scan() {
+    std::vector<ZIN_CORE_REF> refs;
+    ZinJtag_session_withTransport(handle, [&](ZinRT::Zin_Transport& t) { t.listCores(refs); });
+    std::string out;
+    for (const auto& r : refs)
+      out += std::to_string(r.userChainNumber) + ":" + std::to_string(r.coreIndex) + " ";
+    return out;
+  }
+  std::string info(ZIN_CORE_REF ref) {
+    ZinMOX_ValueMap values;
+    uintptr_t word = reinterpret_cast<uintptr_t>(&values);
+    return text(ZinMOX_getCoreInfo(handle, &ref, &word), values);
+  }
+  std::string write(ZIN_CORE_REF ref, ZinMOX_ValueMap values) {
+    uintptr_t word = reinterpret_cast<uintptr_t>(&values);
+    return text(ZinMOX_writeValues(handle, &ref, &word), {});
+  }
+  std::string read(ZIN_CORE_REF ref) {
+    ZinMOX_ValueMap values;
+    uintptr_t word = reinterpret_cast<uintptr_t>(&values);
+    return text(ZinMOX_readValues(handle, &ref, &word), values);
+  }
+  std::string ports(ZIN_CORE_REF ref, uint8_t async) {
+    const uint8_t mask = 0xFF;
+    uint32_t rc = ZinMOX_setPortBits(handle, &ref, &async, &mask, 8, nullptr, nullptr, 0);
+    uint8_t in[3] = {}, sync[5] = {};
+    rc |= ZinMOX_getPortBits(handle, &ref, &in[0], &in[1], &in[2], 8, &sync[0], &sync[1], &sync[2],
+                             &sync[3], &sync[4], 4);
+    std::ostringstream out;
+    out << "rc " << rc << std::hex;
+    for (uint8_t b : in) out << " " << unsigned{b};
+    return out.str();
+  }
+};
+
+// The library's calls on core 0:1:1 (8 async and 4 sync outputs looped back to the inputs),
+// each giving a text that must be the same on both targets.
+std::vector<std::string> exercise(Host& host) {
+  std::vector<std::string> out{host.scan()};
+  for (uint32_t core = 0; core < 4; ++core) out.push_back(host.info({0, 1, core}));
+  ZIN_CORE_REF ref{0, 1, 1};
+  out.push_back(std::to_string(ZinMOX_initCore(host.handle, &ref)));
+  const uint32_t bits[] = {0, 1, 2, 3, 4, 5, 6, 7};
+  ZinMOX_defineBus(host.handle, &ref, "out", ZINMOX_ASYNC_OUTPUT, bits, 8);
+  ZinMOX_defineBus(host.handle, &ref, "in", ZINMOX_ASYNC_INPUT, bits, 8);
+  ZinMOX_defineSignal(host.handle, &ref, "s", ZINMOX_SYNC_OUTPUT, 0);
+  ZinMOX_defineSignal(host.handle, &ref, "sin", ZINMOX_SYNC_INPUT, 0);
+  host.write(ref, {{"out", "00"}, {"s.pulsetrain", "0000"}});
+  host.read(ref);  // clears what earlier runs left in the latches
+  for (const char* value : {"5A", "0F", "F0"}) {
+    out.push_back(host.write(ref, {{"out", value}}));
+    out.push_back(host.read(ref));
+  }
+  out.push_back(host.ports(ref, 0xC3));
+  out.push_back(host.ports(ref, 0x3C));
+  for (const char* train : {"FFFF", "0000"}) {
+    out.push_back(host.write(ref, {{"s.pulsetrain", train}}));
+    out.push_back(host.read(ref));
+  }
+  return out;
+}
+
+class OpenOcdTest : public ::testing::Test {
+ protected:
+  void SetUp() override { ASSERT_TRUE(rig_.ok()) << rig_.log(); }
+  OpenOcdRig rig_;
+};
+
+TEST_F(OpenOcdTest, ExportedFunctionsGiveTheSimulatedTargetsResults) {
+  Host rtl(ZinOpenOcd_openSession("127.0.0.1", static_cast<uint16_t>(rig_.tclPort()), nullptr, 0));
+  ASSERT_NE(rtl.handle, 0U) << ZinOpenOcd_lastError();
+  Host sim(ZinJtag_openSession(std::make_shared<ZinSim::Target>()));
+  const std::vector<std::string> got = exercise(rtl);
+  const std::vector<std::string> want = exercise(sim);
+  ASSERT_EQ(got.size(), want.size());
+  for (size_t i = 0; i < got.size(); ++i) EXPECT_EQ(got[i], want[i]) << "step " << i;
+  EXPECT_EQ(got[0], "1:0 1:1 1:2 1:3 ");
+  EXPECT_EQ(rtl.messages, sim.messages);
+}
+
+TEST_F(OpenOcdTest, BoardsThatDoNotMatchOpenOcdAreRefusedAtConnect) {
+  const struct {
+    const char* board;
+    const char* error;
+  } cases[] = {
+      {R"({"devices":[{"preset":"rtl-model","ir_length":5,"chains":{"1":"0x8"}}]})",
+       "has IR length 5, but OpenOCD at 127.0.0.1"},
+      {R"({"devices":[{"preset":"rtl-model","idcode":"0x12345678"}]})",
+       "expects IDCODE 0x12345678, but OpenOCD at 127.0.0.1"},
+      {R"({"devices":[{"preset":"rtl-model","idcode":"0x0a5e0a5b","idcode_mask":"0x0fffffff"}]})",
+       ""},
+      {R"({"devices":[{"preset":"rtl-model","tap":"xc7.tap"}]})", "has no TAP named xc7.tap"},
+      {R"({"devices":[{"tap":"zinmox.tap","chains":{"1":"0x18"}}]})",
+       "devices[0].chains.1: at most 15"},
+      {R"({"devices":[{"tap":"zin;exit","chains":{"1":8}}]})", "devices[0].tap: a TAP name"},
+      {R"({"devices":[{"preset":"rtl-model","wait":4}]})", "devices[0].wait: unknown key"},
+      {R"({"devices":[]})", "devices: expected a list of 1 to 256"},
+      {"{", "not valid JSON"},
+      {"xilinx-7series", "has no TAP named xc7.tap"},
+  };
+  for (const auto& c : cases) {
+    const uint32_t handle =
+        ZinOpenOcd_openSession("127.0.0.1", static_cast<uint16_t>(rig_.tclPort()), c.board, 2000);
+    const std::string error = ZinOpenOcd_lastError();
+    EXPECT_EQ(handle == 0, *c.error != '\0') << c.board;
+    EXPECT_NE(error.find(c.error), std::string::npos) << c.board << " -> " << error;
+    if (handle != 0) ZinJtag_closeSession(handle);
+  }
+}
+
+TEST_F(OpenOcdTest, EmptyChainHasNoCoreAndACorruptedScanFailsItsCheck) {
+  auto transport = ZinHub::openOpenOcd(parse(rig_.target()));
+  std::vector<ZIN_CORE_REF> refs;
+  transport->listCores(refs);
+  EXPECT_EQ(refs.size(), 4U);  // chains 2 to 4 select BYPASS: no hub, no cores
+  ZIN_CORE_INFO info{};
+  unsigned char status[16] = {};
+  transport->readStatus({0, 2, 0}, info, status, 16, 128);
+  EXPECT_EQ(info.coreType, 0U);
+  std::vector<unsigned char> data(16);
+  EXPECT_NE(errorOf([&] {
+              transport->commandSequence("00 2 0 03 1 00000048 0", data.data(), 128);
+            }).find("no core at 0:2:0"),
+            std::string::npos);
+
+  // A TDO bit flipped on the way: the CRC catches it.
+  class Flipping : public ZinHub::JtagEngine {
+   public:
+    explicit Flipping(std::shared_ptr<ZinHub::JtagEngine> inner) : inner_(std::move(inner)) {}
+    void queueIrScan(uint32_t d, uint32_t l, uint64_t i) override { inner_->queueIrScan(d, l, i); }
+    void queueDrScan(uint32_t d, ZinHub::BitVector tdi) override { inner_->queueDrScan(d, tdi); }
+    std::vector<ZinHub::BitVector> execute() override {
+      auto out = inner_->execute();
+      out.back()[40] ^= 1;
+      return out;
+    }
+    std::shared_ptr<ZinHub::JtagEngine> inner_;
+  };
+  auto engine =
+      std::make_shared<ZinHub::OpenOcdEngine>("127.0.0.1", rig_.tclPort(), ZinHub::rtlModelBoard());
+  ZinHub::HubTransport corrupted(std::make_shared<Flipping>(engine));
+  EXPECT_NE(errorOf([&] {
+              corrupted.readStatus({0, 1, 0}, info, status, 16, 128);
+            }).find("integrity failure"),
+            std::string::npos);
+  EXPECT_NE(errorOf([&] {
+              corrupted.commandSequence("00 1 1 03 1 00000048 0", data.data(), 128);
+            }).find("CRC"),
+            std::string::npos);
+}
+
+// Capture lines, so that a process can die while a sequence runs.
+constexpr int kLines = 1000;
+std::string longSequence() {
+  std::string text;
+  for (int i = 0; i < kLines; ++i) text += std::string(i ? "\n" : "") + "00 1 1 03 1 00000048 0";
+  return text;
+}
+
+TEST_F(OpenOcdTest, DeathMidCallFailsThatCallAndTheNextCallReconnects) {
+  auto transport = ZinHub::openOpenOcd(parse(rig_.target("?timeout=5000")));
+  std::vector<unsigned char> data(kLines * 9);
+  ZIN_CORE_INFO info{};
+  unsigned char status[16] = {};
+  for (const bool model : {false, true}) {
+    // Sequences back to back until one fails: the kill lands in the middle of one.
+    auto calls = std::async(std::launch::async, [&] {
+      const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(20);
+      std::string error = "(no error)";
+      while (error == "(no error)" && std::chrono::steady_clock::now() < end) {
+        error =
+            errorOf([&] { transport->commandSequence(longSequence(), data.data(), kLines * 72); });
+      }
+      return error;
+    });
+    std::this_thread::sleep_for(std::chrono::milliseconds(300));
+    if (model) {
+      rig_.killRtlsim();
+    } else {
+      rig_.killOpenOcd();
+    }
+    const std::string error = calls.get();
+    EXPECT_NE(error.find("OpenOCD at 127.0.0.1:" + std::to_string(rig_.tclPort())),
+              std::string::npos)
+        << error;
+    ASSERT_TRUE(rig_.restart()) << rig_.log();
+    info = {};
+    transport->readStatus({0, 1, 1}, info, status, 16, 128);
+    EXPECT_EQ(info.coreType, 9U) << (model ? "after the model died" : "after OpenOCD died");
+  }
+}
+
+TEST(OpenOcdFaults, NoOpenOcdOrASilentOneIsAClearErrorWithinTheTimeout) {
+  const int port = freeLoopbackPort();
+  EXPECT_EQ(ZinOpenOcd_openSession("127.0.0.1", static_cast<uint16_t>(port), nullptr, 500), 0U);
+  EXPECT_NE(std::string(ZinOpenOcd_lastError())
+                .find("OpenOCD at 127.0.0.1:" + std::to_string(port) + ": cannot connect"),
+            std::string::npos)
+      << ZinOpenOcd_lastError();
+
+  // A port that accepts connections and never answers.
+  const int fd = socket(AF_INET, SOCK_STREAM, 0);
+  sockaddr_in address{};
+  address.sin_family = AF_INET;
+  address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+  socklen_t length = sizeof address;
+  ASSERT_EQ(bind(fd, reinterpret_cast<sockaddr*>(&address), sizeof address), 0);
+  ASSERT_EQ(listen(fd, 4), 0);
+  getsockname(fd, reinterpret_cast<sockaddr*>(&address), &length);
+  const std::string target =
+      "openocd://127.0.0.1:" + std::to_string(ntohs(address.sin_port)) + "?timeout=300";
+  EXPECT_NE(errorOf([&] { ZinHub::openOpenOcd(parse(target)); }).find("no answer within 300 ms"),
+            std::string::npos);
+  close(fd);
+}
+
+TEST(OpenOcdFaults, MalformedTargetTexts) {
+  for (const char* text : {"openocd://", "openocd://host", "openocd://h:0", "openocd://h:70000",
+                           "openocd://h:1?timeout=0", "openocd://h:1?speed=3", "openocd://a;b:1"}) {
+    EXPECT_NE(errorOf([&] { ZinHub::parseOpenOcdTarget(text); }).find("malformed OpenOCD target"),
+              std::string::npos)
+        << text;
+  }
+  const ZinHub::OpenOcdTarget t = parse("openocd://[::1]:6666?board=ecp5&timeout=250");
+  EXPECT_EQ(t.host, "::1");
+  EXPECT_EQ(t.port, 6666);
+  EXPECT_EQ(t.board, "ecp5");
+  EXPECT_EQ(t.timeoutMs, 250U);
+  EXPECT_FALSE(ZinHub::parseOpenOcdTarget("tcp://h:1"));
+  EXPECT_EQ(ZinHub::loadBoard("ecp5").devices.at(0).chainInstructions.at(2), 0x38U);
+}
+
+}  // namespace
+}  // namespace ZinRtlTest
