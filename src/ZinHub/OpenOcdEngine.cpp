@@ -213,6 +213,7 @@ void OpenOcdEngine::runRequest(const std::vector<const Scan*>& scans,
   }
   const std::string script = "if {[catch {" + body + "set _z} _z]} {set _z \"" + kFailed +
                              " $_z\"} else {set _z \"" + kOk + " $_z\"}";
+  lastScript_ = script;
   std::string answer = connection_.request(script, script.size() * 2 + 4096);
   if (answer.rfind(kFailed, 0) == 0) {
     connection_.close();

@@ -42,6 +42,9 @@ class OpenOcdEngine : public JtagEngine {
 
   std::string where() const { return connection_.where(); }
 
+  /// The Tcl script of the last request the engine sent (for benchmarks that replay it).
+  const std::string& lastScript() const { return lastScript_; }
+
  private:
   struct Scan {
     uint32_t device = 0;
@@ -58,6 +61,7 @@ class OpenOcdEngine : public JtagEngine {
   Board board_;
   std::vector<Scan> queue_;
   std::vector<std::optional<uint64_t>> instruction_;  // last instruction queued per device
+  std::string lastScript_;
 };
 
 }  // namespace ZinHub
