@@ -36,7 +36,6 @@ TEST(ErrorPaths, UsageErrorsExitWithTwoAndAHint) {
       {{"write", "0:1:0", "x.value=5"}, 2, "unknown suffix in 'x.value'"},
       {{"write", "0:1:0", "a=1", "A.pulsetrain=1"}, 2, "A is given more than once"},
       {{"define", "0:1:0", "x", "in", "0"}, 2, "unknown port 'in'"},
-      {{"define", "0:1:0", "x", "async_in", "0-"}, 2, "bad bit list '0-'"},
       {{"watch", "0:1:0", "--interval", "-5"}, 2, "--interval"},
       {{"watch", "0:1:0", "--count", "-1"}, 2, "--count: must not be negative"},
       {{"ports", "0:1:0"}, 2, "give read or write"},
