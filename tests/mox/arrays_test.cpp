@@ -1,6 +1,6 @@
 // Packed value arrays: writes of named outputs (one transfer per value, or bursts of up to 16
-// steps), repeated samples of named inputs, the checks that run before anything is sent, and how
-// a signal group stages its bits into the port image and collects them from it.
+// steps), repeated samples of named inputs, the checks that run before anything is sent, and the
+// checks of a signal group that stages its bits into the port image.
 #include <stdexcept>
 #include <string>
 #include <utility>
@@ -234,21 +234,9 @@ class SignalGroup : public ::testing::Test {
   ZinMOX_SignalGroup group(uint32_t type, std::vector<uint32_t> positions, const char* name = "g") {
     return ZinMOX_SignalGroup(&command, type, positions, name, name);
   }
-  const std::string& train(uint32_t bit) { return command.getSyncOutPulseTrains()[bit]; }
 
   ZinRT::ZinMOX_Command command;
 };
-
-TEST_F(SignalGroup, CopiesKeepTheirNamePositionsAndPortImage) {
-  ZinMOX_SignalGroup original = group(Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT, {5, 2, 9}, "bus");
-  ZinMOX_SignalGroup other = group(Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_OUTPUT, {1}, "one");
-  for (const ZinMOX_SignalGroup& copy : {ZinMOX_SignalGroup(original), other = original}) {
-    EXPECT_EQ(copy.getKeyName(), "bus");
-    EXPECT_EQ(copy.getType(), original.getType());
-    EXPECT_EQ(copy.getPositionVector(), (std::vector<uint32_t>{5, 2, 9}));
-    EXPECT_EQ(copy.getCommand(), &command);
-  }
-}
 
 TEST_F(SignalGroup, StagesAsynchronousValuesAtTheirPositions) {
   ZinMOX_SignalGroup g = group(Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_OUTPUT, {7, 3, 5});
@@ -266,57 +254,6 @@ TEST_F(SignalGroup, StagesAsynchronousValuesAtTheirPositions) {
   nine.setValues(value, 2, 1);
   EXPECT_EQ(command.getAsyncOutValueBits(), "0000000001");
   EXPECT_EQ(command.getAsyncOutUpdateBits(), "1111111101");
-}
-
-TEST_F(SignalGroup, SynchronousValuesHoldOrFollowTheStepVectors) {
-  ZinMOX_SignalGroup g = group(Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_OUTPUT, {4, 0, 8});
-  const uint8_t five = 0x05;
-  g.setValues(&five, 1, 0);  // a step count of 0 behaves like 1
-  EXPECT_EQ(train(4) + train(0) + train(8),
-            std::string(16, '1') + std::string(16, '0') + std::string(16, '1'));
-  EXPECT_EQ(command.getSyncOutUpdateBits(), "1000100010");
-  const uint8_t three[3] = {0x01, 0x02, 0x04};  // the last vector repeats on steps 2 to 15
-  g.setValues(three, 3, 3);
-  EXPECT_EQ(train(4) + train(0) + train(8),
-            "1000000000000000"
-            "0100000000000000"
-            "0011111111111111");
-  // Sixteen vectors need sixteen bytes for three bits; more than sixteen are all counted by the
-  // size check, and only the first sixteen are used.
-  std::vector<uint8_t> steps(20);
-  for (uint32_t t = 0; t < 20; ++t) steps[t] = static_cast<uint8_t>(t < 16 ? t % 8 : 7);
-  EXPECT_EQ(logicErrorOf([&] { g.setValues(steps.data(), 15, 16); }), kTooSmall + "g");
-  EXPECT_EQ(logicErrorOf([&] { g.setValues(steps.data(), 19, 20); }), kTooSmall + "g");
-  EXPECT_EQ(train(4), "1000000000000000") << "nothing staged";
-  g.setValues(steps.data(), 20, 20);
-  EXPECT_EQ(train(4) + train(0) + train(8),
-            "0101010101010101"
-            "0011001100110011"
-            "0000111100001111");
-}
-
-TEST_F(SignalGroup, CollectsInputBitsWithoutClearingAny) {
-  // Sync port bit i: value '1' only at i = 2, every activity '1' at i = 9.
-  std::string syncBits, asyncBits;
-  for (int i = 0; i < 10; ++i) syncBits += i == 2 ? "100000" : i == 9 ? "011110" : "000000";
-  for (int i = 0; i < 10; ++i) asyncBits += i == 3 ? "1110" : "0000";
-  command.unpackSyncInputs(syncBits.c_str());
-  command.unpackAsyncInputs(asyncBits.c_str());
-  ZinMOX_SignalGroup sync = group(Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT, {9, 2}, "s");
-  uint8_t v[5] = {0x80, 0, 0, 0, 0};
-  sync.getValues(&v[0], &v[1], &v[2], &v[3], &v[4], 1);
-  EXPECT_EQ(std::vector<uint8_t>(v, v + 5), (std::vector<uint8_t>{0x82, 1, 1, 1, 1}))
-      << "bits already set stay set";
-  ZinMOX_SignalGroup async = group(Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_INPUT, {0, 3}, "a");
-  uint8_t a[5] = {0, 0, 0, 0x5A, 0xA5};
-  async.getValues(&a[0], &a[1], &a[2], &a[3], &a[4], 1);
-  EXPECT_EQ(std::vector<uint8_t>(a, a + 5), (std::vector<uint8_t>{2, 2, 2, 0x5A, 0xA5}));
-  ZinMOX_SignalGroup nine =
-      group(Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_INPUT, {0, 1, 2, 3, 4, 5, 6, 7, 8}, "nine");
-  uint8_t small[2] = {0x11, 0x22};
-  EXPECT_EQ(logicErrorOf([&] { nine.getValues(small, nullptr, nullptr, nullptr, nullptr, 1); }),
-            kTooSmall + "nine");
-  EXPECT_EQ(small[0], 0x11);
 }
 
 }  // namespace

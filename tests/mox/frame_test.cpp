@@ -96,6 +96,7 @@ TEST_F(CallFrame, ReportsEachKindOfFailureWithItsCodeAfterReleasingTheLock) {
     uint32_t code;
     std::string reported;
   };
+  // clang-format off
   const std::vector<Case> cases = {
       {Failure::Runtime, "transfer broke", kErrorCode, "transfer broke"},
       // The abort is recognised by its exact text, whatever the exception type.
@@ -106,6 +107,7 @@ TEST_F(CallFrame, ReportsEachKindOfFailureWithItsCodeAfterReleasingTheLock) {
       {Failure::BadAlloc, "", kErrorCode, std::bad_alloc().what()},
       {Failure::NonStandard, "", kErrorCode, "Zin internal error."},
   };
+  // clang-format on
   for (const Case& c : cases) {
     SCOPED_TRACE(c.reported);
     transport->failNextCommand(c.kind, c.thrown);
@@ -212,46 +214,32 @@ TEST_F(CallFrame, AFailingStatusReadIsReportedWithItsOwnText) {
 
 TEST_F(CallFrame, GetInfoDecodesEachLayoutFromTheVersionKey) {
   struct Case {
-    uint32_t major, minor;
-    std::vector<std::array<uint32_t, 3>> fields;  // (offset, length, value); other bits are 1
-    std::array<uint32_t, 7> expected;  // qx major, minor, alpha; A_in, S_in, A_out, S_out
+    uint32_t major, minor, countOffset, countLength;
+    std::array<uint32_t, 4> counts;  // A_in, S_in, A_out, S_out, one after another
+    std::array<uint32_t, 3> qx;      // expected qx major, minor, alpha
   };
+  // Every word carries qx fields 0xA, 0x5C, 0xE1 at bits 40, 44 and 52 under its counts, and
+  // all other bits set.
+  // clang-format off
   const std::vector<Case> cases = {
-      // Key 0x61: eight-bit counts from bit 40; no qx fields.
-      {6,
-       1,
-       {{40, 8, 0xAB}, {48, 8, 1}, {56, 8, 0x80}, {64, 8, 0xFF}},
-       {0, 0, 0, 0xAB, 1, 0x80, 0xFF}},
-      // 5.18: the key is (5 << 4) | 18 = 0x52, not the sum 0x62.
-      {5, 18, {{40, 8, 3}, {48, 8, 4}, {56, 8, 5}, {64, 8, 6}}, {0, 0, 0, 3, 4, 5, 6}},
-      // Keys 0x62 to 0x9F: sixteen-bit counts from bit 40; a count of 0 is a count.
-      {6,
-       2,
-       {{40, 16, 0x1234}, {56, 16, 0xFFFF}, {72, 16, 0}, {88, 16, 0x8001}},
-       {0, 0, 0, 0x1234, 0xFFFF, 0, 0x8001}},
-      {9,
-       15,
-       {{40, 16, 0x0102}, {56, 16, 0x0304}, {72, 16, 0x0506}, {88, 16, 0x0708}},
-       {0, 0, 0, 0x0102, 0x0304, 0x0506, 0x0708}},
-      // 9.16: (9 << 4) | 16 = 0x90 (the sum would be 0xA0).
-      {9, 16, {{40, 16, 11}, {56, 16, 22}, {72, 16, 33}, {88, 16, 44}}, {0, 0, 0, 11, 22, 33, 44}},
-      // Key 0xA0: the qx version at 40/44/52, counts from bit 60.
-      {10,
-       0,
-       {{40, 4, 0xA},
-        {44, 8, 0x5C},
-        {52, 8, 0xE1},
-        {60, 16, 0xBEEF},
-        {76, 16, 1},
-        {92, 16, 0x7FFF},
-        {108, 16, 0x1000}},
-       {0xA, 0x5C, 0xE1, 0xBEEF, 1, 0x7FFF, 0x1000}},
+      {6, 1, 40, 8, {0xAB, 1, 0x80, 0xFF}, {0, 0, 0}},      // key 0x61: eight-bit counts
+      {5, 18, 40, 8, {3, 4, 5, 6}, {0, 0, 0}},              // (5 << 4) | 18 = 0x52, not 0x62
+      {6, 2, 40, 16, {0x1234, 0xFFFF, 0, 0x8001}, {0, 0, 0}},  // from 0x62: sixteen bits
+      {9, 15, 40, 16, {0x0102, 0x0304, 0x0506, 0x0708}, {0, 0, 0}},
+      {9, 16, 40, 16, {11, 22, 33, 44}, {0, 0, 0}},         // (9 << 4) | 16 = 0x90, not 0xA0
+      {10, 0, 60, 16, {0xBEEF, 1, 0x7FFF, 0x1000}, {0xA, 0x5C, 0xE1}},  // from 0xA0: qx too
   };
+  // clang-format on
   uint32_t coreIndex = 0;
   for (const Case& c : cases) {
     SCOPED_TRACE(testing::Message() << c.major << "." << c.minor);
     std::vector<unsigned char> statusWord(16, 0xFF);
-    for (const auto& field : c.fields) setStatusBits(statusWord, field[0], field[1], field[2]);
+    setStatusBits(statusWord, 40, 4, 0xA);
+    setStatusBits(statusWord, 44, 8, 0x5C);
+    setStatusBits(statusWord, 52, 8, 0xE1);
+    for (uint32_t k = 0; k < 4; ++k) {
+      setStatusBits(statusWord, c.countOffset + k * c.countLength, c.countLength, c.counts[k]);
+    }
     ZIN_CORE_REF at{4, 1, coreIndex++};
     transport->placeCore(at, ZIN_CORE_INFO{0x4321, 9, c.major, c.minor, 7}, statusWord);
     std::memset(&info, 0xA5, sizeof info);
@@ -262,9 +250,9 @@ TEST_F(CallFrame, GetInfoDecodesEachLayoutFromTheVersionKey) {
                                           info.qx_minor_version,   info.qx_minor_version_alpha,
                                           info.async_input_count,  info.sync_input_count,
                                           info.async_output_count, info.sync_output_count};
-    const auto& e = c.expected;
-    EXPECT_EQ(got, (std::array<uint32_t, 12>{0x4321, 9, c.major, c.minor, 7, e[0], e[1], e[2], e[3],
-                                             e[4], e[5], e[6]}));
+    EXPECT_EQ(got,
+              (std::array<uint32_t, 12>{0x4321, 9, c.major, c.minor, 7, c.qx[0], c.qx[1], c.qx[2],
+                                        c.counts[0], c.counts[1], c.counts[2], c.counts[3]}));
   }
   expectNoMessages();
 }

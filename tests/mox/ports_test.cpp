@@ -244,39 +244,6 @@ TEST_F(PortBits, CountAndPointerChecksRunInOrderAndSendNothing) {
   expectNoMessages();
 }
 
-TEST_F(PortBits, PacksValuesMasksAndStepVectors) {
-  // Spare bits above each port's width are set and must be ignored.
-  const std::vector<uint8_t> asyncData = packValue(0xF000 | 0x9C5, 2),
-                             asyncMask = packValue(0xF000 | 0x30F, 2),
-                             syncMask = packValue(0xFC00 | 0x201, 2);
-  std::vector<uint8_t> steps;
-  std::vector<uint32_t> stepValues;
-  for (uint32_t t = 0; t < 16; ++t) {
-    stepValues.push_back((t * 97 + 13) & 0x3FF);
-    const std::vector<uint8_t> bytes = packValue(stepValues.back() | 0xFC00, 2);
-    steps.insert(steps.end(), bytes.begin(), bytes.end());
-  }
-  ASSERT_EQ(
-      set(asyncData.data(), asyncMask.data(), kAsyncOut, steps.data(), syncMask.data(), kSyncOut),
-      0u);
-  const WriteImage image = lastWrite(kAsyncOut, kSyncOut);
-  EXPECT_EQ(image.asyncValues, unpackBits(asyncData.data(), kAsyncOut));
-  EXPECT_EQ(image.asyncUpdate, unpackBits(asyncMask.data(), kAsyncOut));
-  EXPECT_EQ(image.syncUpdate, "1000000001");
-  for (uint32_t bit = 0; bit < kSyncOut; ++bit) {
-    std::string expected;
-    for (uint32_t t = 0; t < 16; ++t) expected.push_back(((stepValues[t] >> bit) & 1) ? '1' : '0');
-    EXPECT_EQ(image.steps.at(bit), expected) << "synchronous output bit " << bit;
-  }
-  // Only the synchronous port: asynchronous values stay, their marks are cleared.
-  const std::vector<uint8_t> high(32, 0xFF);
-  ASSERT_EQ(set(nullptr, nullptr, 0, high.data(), syncMask.data(), kSyncOut), 0u);
-  WriteImage expected = image;
-  expected.asyncUpdate = std::string(kAsyncOut, '0');
-  expected.steps.assign(kSyncOut, std::string(16, '1'));
-  EXPECT_EQ(writeDataHex(lastWrite(kAsyncOut, kSyncOut)), writeDataHex(expected));
-}
-
 TEST_F(PortBits, ReadFillsTheVectorsAskedFor) {
   std::mt19937 rng(21);
   const std::vector<uint8_t> untouched(2, 0xEE);

@@ -274,19 +274,4 @@ TEST_F(ReadValues, WithoutNamedInputsOrOnAFailedReadTheMapStaysAsItWas) {
   EXPECT_EQ(map, (ZinMOX_ValueMap{{"x", "1"}}));
 }
 
-TEST_F(ReadValues, ReportedTextsWriteBackIntoTheSameBits) {
-  initMoxCore(ref, 12, 0, 12, 0);
-  std::mt19937 rng(32);
-  for (int round = 0; round < 4; ++round) {
-    const InputImage image = InputImage::random(12, 0, rng);
-    transport->queueReadData(readDataFor(image));
-    ZinMOX_ValueMap in;
-    ASSERT_EQ(read(in), 0u);
-    ZinMOX_ValueMap out{{"async_out_data", in["async_in_data"]}};
-    uintptr_t word = mapWord(out);
-    ASSERT_EQ(ZinMOX_writeValues(handle, &ref, &word), 0u);
-    EXPECT_EQ(lastWrite(12, 0).asyncValues, image.asyncValue) << in["async_in_data"];
-  }
-}
-
 }  // namespace
