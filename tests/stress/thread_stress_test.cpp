@@ -88,6 +88,7 @@ class Worker {
     ZinRT::ZinMOX_ValueMap map;
     uintptr_t word = reinterpret_cast<uintptr_t>(&map);
     uint8_t data[8][2] = {};
+    const uint8_t steps[16 * 2] = {};  // sixteen step vectors of twelve bits
     if (pick < 15) {
       check("define",
             ZinMOX_defineSignal(handle_, &ref_, name.c_str(), ZINMOX_ASYNC_OUTPUT, next() % 16));
@@ -107,7 +108,7 @@ class Worker {
       check("readValues", ZinMOX_readValues(handle_, &ref_, &word));
     } else if (pick < 78) {
       check("setPortBits",
-            ZinMOX_setPortBits(handle_, &ref_, data[0], data[1], 16, data[2], data[3], 12));
+            ZinMOX_setPortBits(handle_, &ref_, data[0], data[1], 16, steps, data[3], 12));
     } else if (pick < 86) {
       check("getPortBits", ZinMOX_getPortBits(handle_, &ref_, data[0], data[1], data[2], 16,
                                               data[3], data[4], data[5], data[6], data[7], 12));
