@@ -42,29 +42,20 @@ TEST_F(Ports, WriteTextsCarryValuesStepsAndMarksInOrder) {
     uint8_t (*step)(int t);
     const char* text;
   };
+  // clang-format off
   const std::vector<Case> cases = {
       // Values of bits 0..3: 1 0 1 0, all marked: D = "1010" "1111".
       {{1, 2, 0}, 4, 0, 0x05, 0x0F, 0, nullptr, "01 2 0 01 0 00000009 AF\n01 2 0 02 0 00000004 0"},
       // Bit 0 is 1 on steps 0..3, bit 1 on the odd steps: D = "1111000000000000"
       // "0101010101010101" "11": 34 bits, 35 on the wire.
-      {{1, 2, 0},
-       0,
-       2,
-       0,
-       0,
-       0x03,
+      {{1, 2, 0}, 0, 2, 0, 0, 0x03,
        [](int t) { return static_cast<uint8_t>((t < 4 ? 1 : 0) | (t % 2 ? 2 : 0)); },
        "01 2 0 01 0 00000023 3C0015557\n01 2 0 02 0 00000004 0"},
       // All ports, at a reference with hexadecimal digits.
-      {{0xAB, 0xF, 0x7},
-       5,
-       3,
-       0x13,
-       0x06,
-       0x05,
-       [](int t) { return static_cast<uint8_t>(t % 8); },
+      {{0xAB, 0xF, 0x7}, 5, 3, 0x13, 0x06, 0x05, [](int t) { return static_cast<uint8_t>(t % 8); },
        "AB F 7 01 0 0000003E 19555533330F0F65\nAB F 7 02 0 00000004 0"},
   };
+  // clang-format on
   for (const Case& c : cases) {
     SCOPED_TRACE(c.text);
     ref = c.at;
@@ -94,18 +85,15 @@ TEST_F(Ports, ReadTextsRoundEachLineToWholeBytesAndTheDataUnpacks) {
     const char* text;  // null: the text is checked against the second implementation
   };
   // L = 4*A_in + 6*S_in + 16 bits on the first line, rounded up to bytes, plus 8 for the second.
-  const std::vector<Case> cases = {{8, 0, 56, "01 2 0 03 1 00000030 0\n01 2 0 04 1 00000004 0"},
-                                   {2, 2, 48, "01 2 0 03 1 00000024 0\n01 2 0 04 1 00000004 0"},
-                                   {3, 2, 48, "01 2 0 03 1 00000028 0\n01 2 0 04 1 00000004 0"},
-                                   {1, 0, 32, nullptr},
-                                   {0, 1, 32, nullptr},
-                                   {2, 0, 32, nullptr},
-                                   {1, 1, 40, nullptr},
-                                   {0, 3, 48, nullptr},
-                                   {16, 0, 88, nullptr},
-                                   {5, 7, 88, nullptr},
-                                   {0, 9, 80, nullptr},
-                                   {13, 0, 80, nullptr}};
+  // clang-format off
+  const std::vector<Case> cases = {
+      {8, 0, 56, "01 2 0 03 1 00000030 0\n01 2 0 04 1 00000004 0"},
+      {2, 2, 48, "01 2 0 03 1 00000024 0\n01 2 0 04 1 00000004 0"},
+      {3, 2, 48, "01 2 0 03 1 00000028 0\n01 2 0 04 1 00000004 0"},
+      {1, 0, 32, nullptr}, {0, 1, 32, nullptr}, {2, 0, 32, nullptr}, {1, 1, 40, nullptr},
+      {0, 3, 48, nullptr}, {16, 0, 88, nullptr}, {5, 7, 88, nullptr}, {0, 9, 80, nullptr},
+      {13, 0, 80, nullptr}};
+  // clang-format on
   std::mt19937 rng(11);
   for (const Case& c : cases) {
     SCOPED_TRACE(testing::Message() << "A_in " << c.asyncIn << ", S_in " << c.syncIn);
