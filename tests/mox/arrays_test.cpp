@@ -6,8 +6,8 @@
 #include <utility>
 #include <vector>
 
-#include "ZinMOX/ZinMOX_Command.h"
 #include "ZinMOX/ZinMOX_SignalGroup.h"
+#include "internal/ZinMOX_Command.h"
 #include "support/SessionFixture.h"
 
 namespace {
