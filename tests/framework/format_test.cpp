@@ -1,11 +1,10 @@
 // The utility library's bit and hex formats, through every public conversion that uses them: one
-// table of values in all four forms (bit text, hexadecimal text, reverse bit text, packed bytes),
-// the rejection texts of malformed input, and round trips over every length up to 300 bits so
-// that each word boundary and padding is crossed.
+// table of values in all four forms (bit text, hexadecimal text, reverse bit text, packed bytes)
+// and the rejection texts of malformed input; the byte buffer's storage and bit fields. Random
+// lengths against bit-by-bit references are in tests/stress.
 #include <gtest/gtest.h>
 
 #include <memory>
-#include <random>
 #include <stdexcept>
 #include <string>
 #include <vector>
@@ -119,6 +118,9 @@ TEST(Format, NumbersAndByteRangesHaveKnownTexts) {
   std::unique_ptr<Zin_ByteBuffer> middle(textBuffer("xfA3x").hex2Bin(1, 3));
   EXPECT_EQ((*middle)[0], 0xA3);
   EXPECT_EQ((*middle)[1], 0x0F);
+  std::string shared = "11010";  // input and output may be the same string
+  EXPECT_EQ(Zin_NumberUtil::binStr2HexStr(shared, shared), "1A");
+  EXPECT_EQ(Zin_NumberUtil::hexStr2BinStr(shared.c_str(), 8, shared), "00011010");
 }
 
 TEST(Format, MalformedInputIsRejectedWithItsText) {
@@ -146,27 +148,44 @@ TEST(Format, MalformedInputIsRejectedWithItsText) {
   EXPECT_EQ(packed[1], 0x01);
 }
 
-TEST(Format, EveryLengthRoundTripsAndMayShareItsOutput) {
-  std::mt19937 rng(1234);
-  std::string hex;
-  std::string back;
-  for (uint32_t n = 0; n <= 300; ++n) {
-    std::string bits(n, '0');
-    for (char& c : bits) c = (rng() & 1u) != 0 ? '1' : '0';
-    Zin_NumberUtil::binStr2HexStr(bits, hex);
-    ASSERT_EQ(hex.size(), (n + 3) / 4);
-    ASSERT_EQ(Zin_NumberUtil::hexStr2BinStr(hex.c_str(), n, back), bits) << n;
-    std::vector<unsigned char> packed((n + 7) / 8);
-    Zin_NumberUtil::reverseBinStr2Bin(bits, packed.data());
-    ASSERT_EQ(Zin_NumberUtil::bin2ReverseBinStr(packed.data(), n, back), bits) << n;
-    const Zin_ByteBuffer bytes(packed.data(), static_cast<uint32_t>(packed.size()));
-    Zin_ByteBuffer text;
-    bytes.bin2HexString(0, text);
-    if (text.getSize() == 0) continue;
-    std::unique_ptr<Zin_ByteBuffer> again(text.hex2Bin(0, text.getSize() - 1));
-    ASSERT_EQ(std::vector<unsigned char>(again->uPtr(), again->uPtr() + again->getSize()), packed);
-  }
-  std::string text = "11010";
-  EXPECT_EQ(Zin_NumberUtil::binStr2HexStr(text, text), "1A");
-  EXPECT_EQ(Zin_NumberUtil::hexStr2BinStr(text.c_str(), 8, text), "00011010");
+TEST(ByteBuffer, StorageKeepsATerminatingZero) {
+  Zin_ByteBuffer empty;
+  EXPECT_EQ(empty.getSize(), 0u);
+  EXPECT_STREQ(empty.ptr(), "");
+
+  Zin_ByteBuffer zeros(154, 10, 10);
+  EXPECT_EQ(zeros.getSize(), 154u);
+  for (uint32_t i = 0; i < 154; ++i) ASSERT_EQ(zeros[i], 0);
+  EXPECT_THROW(zeros[154], std::out_of_range);
+
+  Zin_ByteBuffer text = textBuffer("AB");
+  text.append(reinterpret_cast<const unsigned char*>("CD"), 2);
+  EXPECT_STREQ(text.ptr(), "ABCD");
+  text.append(text.uPtr(), 4);  // appending the buffer to itself
+  EXPECT_STREQ(text.ptr(), "ABCDABCD");
+  text.resize(3);
+  EXPECT_STREQ(text.ptr(), "ABC");
+  text.resize(5);
+  EXPECT_EQ(text[3], 0);
+  EXPECT_EQ(text[4], 0);
+
+  Zin_ByteBuffer copy = text;
+  Zin_ByteBuffer moved = std::move(text);
+  EXPECT_EQ(copy.getSize(), 5u);
+  EXPECT_STREQ(moved.ptr(), "ABC");
+  EXPECT_EQ(text.getSize(), 0u);  // NOLINT: a moved-from buffer is empty and still usable
+  EXPECT_STREQ(text.ptr(), "");
+}
+
+TEST(ByteBuffer, GetBitsReadsLittleEndianBitFields) {
+  const unsigned char bytes[] = {0xB4, 0x5A, 0xFF, 0x01};
+  const Zin_ByteBuffer b(bytes, 4);
+  EXPECT_EQ(b.getBits(0, 8), 0xB4u);
+  EXPECT_EQ(b.getBits(2, 4), 0xDu);   // bits 2..5 of 0xB4
+  EXPECT_EQ(b.getBits(4, 8), 0xABu);  // high half of byte 0, low half of byte 1
+  EXPECT_EQ(b.getBits(0, 32), 0x01FF5AB4u);
+  EXPECT_EQ(b.getBits(20, 16), 0x001Fu);  // bits past the end read as 0
+  EXPECT_EQ(b.getBits(1000, 16), 0u);
+  EXPECT_EQ(b.getBits(3, 0), 0u);
+  EXPECT_THROW(b.getBits(0, 33), std::invalid_argument);
 }

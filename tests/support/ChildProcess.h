@@ -1,13 +1,13 @@
 // A child process of a test: started with its output captured, always stopped at the end.
-#ifndef ZIN_TESTS_RTLSIM_CHILDPROCESS_H
-#define ZIN_TESTS_RTLSIM_CHILDPROCESS_H
+#ifndef ZIN_TEST_SUPPORT_CHILDPROCESS_H
+#define ZIN_TEST_SUPPORT_CHILDPROCESS_H
 
 #include <sys/types.h>
 
 #include <string>
 #include <vector>
 
-namespace ZinRtlTest {
+namespace ZinTest {
 
 class ChildProcess {
  public:
@@ -40,6 +40,6 @@ int freeLoopbackPort();
 /// A connected loopback TCP socket (retrying until `timeoutMs`), or -1.
 int connectLoopback(int port, int timeoutMs);
 
-}  // namespace ZinRtlTest
+}  // namespace ZinTest
 
 #endif

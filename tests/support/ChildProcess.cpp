@@ -1,5 +1,5 @@
 // A child process of a test, and loopback socket helpers.
-#include "ChildProcess.h"
+#include "support/ChildProcess.h"
 
 #include <arpa/inet.h>
 #include <fcntl.h>
@@ -17,7 +17,7 @@
 
 extern char** environ;
 
-namespace ZinRtlTest {
+namespace ZinTest {
 
 namespace {
 
@@ -127,4 +127,4 @@ int connectLoopback(int port, int timeoutMs) {
   }
 }
 
-}  // namespace ZinRtlTest
+}  // namespace ZinTest
