@@ -9,10 +9,10 @@
 #include <thread>
 #include <vector>
 
+#include "ZinMOX/ZinMOX.h"
 #include "ZinRT/ZinJtag.h"
 #include "ZinRT/Zin_CoreComm.h"
 #include "ZinRT/Zin_CoreList.h"
-#include "ZinMOX/ZinMOX.h"
 #include "ZinTarget/ScriptedTransport.h"
 #include "ZinTarget/StatusWord.h"
 
@@ -133,7 +133,7 @@ TEST_F(CoreListTest, StatusWordsOfEveryLayoutDecodeToTheirFields) {
   struct Case {
     uint32_t major, minor, ai, si, ao, so, qxMajor, qxMinor;
   };
-  const Case cases[] = {{6, 1, 255, 1, 0x80, 7, 0, 0},         // key 0x61: eight-bit counts
+  const Case cases[] = {{6, 1, 255, 1, 0x80, 7, 0, 0},          // key 0x61: eight-bit counts
                         {5, 18, 3, 4, 5, 6, 0, 0},              // key 0x52 (an OR, not a sum)
                         {9, 15, 0xFFFF, 0x1234, 1, 300, 0, 0},  // sixteen-bit counts
                         {10, 0, 3, 0xFFFF, 0x8001, 12, 0xF, 0xA5}};
