@@ -1,7 +1,6 @@
-// The utility library's bit and hex formats, through every public conversion that uses them: one
-// table of values in all four forms (bit text, hexadecimal text, reverse bit text, packed bytes)
-// and the rejection texts of malformed input; the byte buffer's storage and bit fields. Random
-// lengths against bit-by-bit references are in tests/stress.
+// The utility library's number texts, byte ranges and the rejection texts of malformed input; the
+// byte buffer's storage and bit fields. Every conversion against bit-by-bit references, over
+// random lengths, is in tests/stress.
 #include <gtest/gtest.h>
 
 #include <memory>
@@ -17,35 +16,9 @@ using ZinRT::Zin_NumberUtil;
 
 namespace {
 
-struct Form {
-  std::string bits;  // most significant first
-  std::string hex;
-  std::vector<unsigned char> packed;  // bit i in bit i mod 8 of byte i/8
-};
-
-// Widths around the digit, byte and eight-character word boundaries.
-const std::vector<Form> kForms = {
-    {"", "", {}},
-    {"1", "1", {0x01}},
-    {"0110", "6", {0x06}},
-    {"11010", "1A", {0x1A}},
-    {"00001111", "0F", {0x0F}},
-    {"111100001", "1E1", {0xE1, 0x01}},
-    {"0000000011111111", "00FF", {0xFF, 0x00}},
-    {"10101111000010010110100101", "2BC25A5", {0xA5, 0x25, 0xBC, 0x02}},
-    {"11111111111111111111111111111110111111111111111111111111111111111",
-     "1FFFFFFFDFFFFFFFF",
-     {0xFF, 0xFF, 0xFF, 0xFF, 0xFD, 0xFF, 0xFF, 0xFF, 0x01}},
-};
-
 Zin_ByteBuffer textBuffer(const std::string& text) {
   return Zin_ByteBuffer(reinterpret_cast<const unsigned char*>(text.data()),
                         static_cast<uint32_t>(text.size()));
-}
-
-std::string lowerCase(std::string text) {
-  for (char& c : text) c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
-  return text;
 }
 
 template <typename Call>
@@ -59,34 +32,6 @@ std::string rejection(Call call) {
 }
 
 }  // namespace
-
-TEST(Format, EveryConversionAgreesOnTheTableOfForms) {
-  std::string out;
-  for (const Form& f : kForms) {
-    SCOPED_TRACE(f.bits);
-    const auto n = static_cast<uint32_t>(f.bits.size());
-    const std::string reverse(f.bits.rbegin(), f.bits.rend());
-    EXPECT_EQ(Zin_NumberUtil::binStr2HexStr(f.bits, out), f.hex);
-    EXPECT_EQ(Zin_NumberUtil::hexStr2BinStr(f.hex.c_str(), n, out), f.bits);
-    EXPECT_EQ(Zin_NumberUtil::hexStr2BinStr(lowerCase(f.hex).c_str(), n, out), f.bits);
-    EXPECT_EQ(Zin_NumberUtil::bin2ReverseBinStr(f.packed.data(), n, out), reverse);
-    std::vector<unsigned char> packed(f.packed.size() + 1, 0xEE);
-    Zin_NumberUtil::reverseBinStr2Bin(reverse, packed.data());
-    EXPECT_EQ(std::vector<unsigned char>(packed.begin(), packed.end() - 1), f.packed);
-    EXPECT_EQ(packed.back(), 0xEE) << "wrote past ceil(n/8) bytes";
-
-    const Zin_ByteBuffer bytes(f.packed.data(), static_cast<uint32_t>(f.packed.size()));
-    std::unique_ptr<Zin_ByteBuffer> text(bytes.bin2HexString(0, n));
-    EXPECT_STREQ(text->ptr(), f.hex.c_str());
-    if (f.hex.empty()) continue;
-    // hex2Bin reads whole digits: the packed bytes of the digits' value.
-    const Zin_ByteBuffer digits = textBuffer(lowerCase(f.hex));
-    std::unique_ptr<Zin_ByteBuffer> bin(digits.hex2Bin(0, digits.getSize() - 1));
-    EXPECT_EQ(
-        std::vector<unsigned char>(bin->uPtr(), bin->uPtr() + bin->getSize()),
-        std::vector<unsigned char>(f.packed.begin(), f.packed.begin() + (f.hex.size() + 1) / 2));
-  }
-}
 
 TEST(Format, NumbersAndByteRangesHaveKnownTexts) {
   std::string out = "left over";
