@@ -82,6 +82,37 @@ inline unsigned onesWordLsbFirst(uint64_t word) {
   return static_cast<unsigned>((ones * 0x0102040810204080ull) >> 56);
 }
 
+/// The top bit (0x80) of each byte of `word` that is a hexadecimal digit of either case, and
+/// zero in every other byte.
+inline uint64_t hexDigitBytes(uint64_t word) {
+  constexpr uint64_t ones = 0x0101010101010101ull;
+  constexpr uint64_t high = 0x8080808080808080ull;
+  const uint64_t low = word & ~high;  // seven bits per byte: the sums below carry into no neighbour
+  const auto inRange = [](uint64_t w, uint64_t first, uint64_t last) {
+    return (w + (0x80 - first) * ones) & ~(w + (0x7F - last) * ones) & high;
+  };
+  // Setting bit 5 turns 'A'-'F' into 'a'-'f' and leaves the digits as they are.
+  return ~word & high & (inRange(low, '0', '9') | inRange(low | 0x2020202020202020ull, 'a', 'f'));
+}
+
+/// Whether all eight characters of a word are hexadecimal digits.
+inline bool isHexWord(uint64_t word) {
+  return hexDigitBytes(word) == 0x8080808080808080ull;
+}
+
+/// The eight digits of a hexadecimal word (isHexWord) as four bytes, each from a pair of digits
+/// read most significant first: byte m of the result (least significant first) is the value of
+/// characters 2m and 2m+1.
+inline uint32_t hexWordPairs(uint64_t word) {
+  // A letter has bit 6 set and its value minus 9 in its low four bits.
+  const uint64_t nibbles =
+      (word & 0x0F0F0F0F0F0F0F0Full) + ((word >> 6) & 0x0101010101010101ull) * 9;
+  uint64_t pairs =
+      ((nibbles & 0x000F000F000F000Full) << 4) | ((nibbles >> 8) & 0x000F000F000F000Full);
+  pairs = (pairs | (pairs >> 8)) & 0x0000FFFF0000FFFFull;
+  return static_cast<uint32_t>(pairs | (pairs >> 16));
+}
+
 }  // namespace ZinRT::detail
 
 #endif

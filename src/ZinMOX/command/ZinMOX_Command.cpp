@@ -26,27 +26,43 @@ constexpr uint32_t READ_TRAILER_BITS = 16;
 // Characters of a line without its data: "DD C I CC F LLLLLLLL " and the newline.
 constexpr size_t SHORT_LINE_LENGTH = 22 + 1;
 
+// `value` as `widthBits`/4 upper-case hex digits and a blank. A value that does not fit is
+// left to the framework's conversion, which fails with its own message.
+void appendField(std::string& text, uint32_t value, uint32_t widthBits, std::string& scratch) {
+  const uint32_t digits = widthBits / 4;
+  if (digits > 8 || (digits < 8 && (static_cast<uint64_t>(value) >> (4 * digits)) != 0)) {
+    text += Zin_NumberUtil::uInt2HexStr(value, widthBits, scratch);
+    text += ' ';
+    return;
+  }
+  char field[9];
+  for (uint32_t k = 0; k < digits; ++k)
+    field[digits - 1 - k] = mox::kHexDigits[(value >> (4 * k)) & 0x0F];
+  field[digits] = ' ';
+  text.append(field, digits + 1);
+}
+
 // "DD C I " of a core reference: two, one and one hex digits, each followed by a blank.
 void appendRefPrefix(std::string& text, const ZIN_CORE_REF& ref, std::string& scratch) {
-  text += Zin_NumberUtil::uInt2HexStr(ref.deviceIndex, 8, scratch);
-  text += ' ';
-  text += Zin_NumberUtil::uInt2HexStr(ref.userChainNumber, 4, scratch);
-  text += ' ';
-  text += Zin_NumberUtil::uInt2HexStr(ref.coreIndex, 4, scratch);
-  text += ' ';
+  appendField(text, ref.deviceIndex, 8, scratch);
+  appendField(text, ref.userChainNumber, 4, scratch);
+  appendField(text, ref.coreIndex, 4, scratch);
 }
 
 // One line: prefix, code, read flag, bit length, data.
 void appendLine(std::string& text, const ZIN_CORE_REF& ref, uint32_t code, char readFlag,
                 uint32_t bitLength, const std::string& data, std::string& scratch) {
   appendRefPrefix(text, ref, scratch);
-  text += Zin_NumberUtil::uInt2HexStr(code, 8, scratch);
-  text += ' ';
+  appendField(text, code, 8, scratch);
   text += readFlag;
   text += ' ';
-  text += Zin_NumberUtil::uInt2HexStr(bitLength, 32, scratch);
-  text += ' ';
+  appendField(text, bitLength, 32, scratch);
   text += data;
+}
+
+bool sameRef(const ZIN_CORE_REF& a, const ZIN_CORE_REF& b) {
+  return a.deviceIndex == b.deviceIndex && a.userChainNumber == b.userChainNumber &&
+         a.coreIndex == b.coreIndex;
 }
 
 }  // namespace
@@ -131,11 +147,18 @@ bool ZinMOX_Command::appendDataHex(std::string& text, size_t dataBits) const {
 
 void ZinMOX_Command::writeOutputs(uint32_t handle, const ZIN_CORE_REF& coreRef) {
   if (moxCoreInfo.async_output_count == 0 && moxCoreInfo.sync_output_count == 0) return;
-  std::string text;
-  std::string commitLine;
+  // The sequence is rendered into storage kept from the last write; the code-02 line depends
+  // only on the reference and is rendered again only when the reference changes.
+  if (!commitLine_.valid || !sameRef(commitLine_.ref, coreRef)) {
+    commitLine_.valid = false;
+    buildCommandText(coreRef, 2, commitLine_.text, nullptr);
+    commitLine_.ref = coreRef;
+    commitLine_.valid = true;
+  }
+  std::string& text = writeText_;
   buildCommandText(coreRef, 1, text, nullptr);
   text += '\n';
-  text += buildCommandText(coreRef, 2, commitLine, nullptr);
+  text += commitLine_.text;
   Zin_CoreComm::commandSequence(handle, text, nullptr, 0, nullptr);
   ZinJtag_target_flush(handle);
 }
@@ -144,15 +167,21 @@ void ZinMOX_Command::readInputs(uint32_t handle, const ZIN_CORE_REF& coreRef) {
   const uint32_t aIn = moxCoreInfo.async_input_count;
   const uint32_t sIn = moxCoreInfo.sync_input_count;
   if (aIn == 0 && sIn == 0) return;
-  std::string text;
-  uint32_t readBits = 0;
-  buildCommandText(coreRef, 3, text, &readBits);
-  Zin_ByteBuffer readData(mox::byteCount(readBits), 0, 0);
-  Zin_CoreComm::commandSequence(handle, text, readData.uPtr(), readBits, nullptr);
+  // The read sequence depends only on the reference and the port widths: rendered again only
+  // when the reference changes.
+  if (!readLines_.valid || !sameRef(readLines_.ref, coreRef)) {
+    readLines_.valid = false;
+    buildCommandText(coreRef, 3, readLines_.text, &readLines_.readBits);
+    readLines_.ref = coreRef;
+    readLines_.valid = true;
+  }
+  const uint32_t readBits = readLines_.readBits;
+  readData_.resize(mox::byteCount(readBits));
+  Zin_CoreComm::commandSequence(handle, readLines_.text, readData_.data(), readBits, nullptr);
 
   const uint32_t inputBits = ASYNC_IN_BITS * aIn + SYNC_IN_BITS * sIn;
-  std::string bits;
-  mox::msbFirstBitText(readData.uPtr(), inputBits, bits);
+  std::string& bits = readBitText_;
+  mox::msbFirstBitText(readData_.data(), inputBits, bits);
   const uint32_t asyncBits = inputBits - SYNC_IN_BITS * sIn;
   if (sIn != 0) unpackSyncInputs(bits.c_str() + asyncBits);
   if (aIn != 0) unpackAsyncInputs(bits.c_str());

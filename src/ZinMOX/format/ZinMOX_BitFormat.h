@@ -72,6 +72,31 @@ inline bool isBitWord(uint64_t word) {
   return (word & 0xFEFEFEFEFEFEFEFEull) == 0x3030303030303030ull;
 }
 
+/// Whether all eight characters of a word are hexadecimal digits of either case.
+inline bool isHexWord(uint64_t word) {
+  constexpr uint64_t ones = 0x0101010101010101ull;
+  constexpr uint64_t high = 0x8080808080808080ull;
+  const uint64_t low = word & ~high;  // seven bits per byte: the sums below carry into no neighbour
+  const auto inRange = [](uint64_t w, uint64_t first, uint64_t last) {
+    return (w + (0x80 - first) * ones) & ~(w + (0x7F - last) * ones) & high;
+  };
+  // Setting bit 5 turns 'A'-'F' into 'a'-'f' and leaves the digits as they are.
+  const uint64_t digits = inRange(low, '0', '9') | inRange(low | 0x2020202020202020ull, 'a', 'f');
+  return (~word & high & digits) == high;
+}
+
+/// Whether all `n` characters of `text` are hexadecimal digits of either case.
+inline bool allHexDigits(const char* text, size_t n) {
+  size_t i = 0;
+  for (; n - i >= 8; i += 8) {
+    if (!isHexWord(loadWord(text + i))) return false;
+  }
+  for (; i < n; ++i) {
+    if (hexDigitValue(text[i]) < 0) return false;
+  }
+  return true;
+}
+
 /// The eight bit characters of a word as a byte, the first character most significant.
 inline unsigned bitWordMsbFirst(uint64_t word) {
   return static_cast<unsigned>(((word & 0x0101010101010101ull) * 0x8040201008040201ull) >> 56);
@@ -88,6 +113,29 @@ inline void msbFirstBitText(const unsigned char* data, uint32_t n, std::string& 
     std::memcpy(out + (n - 8 - 8 * q), kByteBitsMsbFirst[data[q]].data(), 8);
   }
   if (rest != 0) std::memcpy(out, kByteBitsMsbFirst[data[whole]].data() + (8 - rest), rest);
+}
+
+/// A byte whose bit k is 1 exactly where character k of `word` is '1' (the first character is
+/// bit 0).
+inline unsigned onesWordLsbFirst(uint64_t word) {
+  const uint64_t diff = word ^ 0x3131313131313131ull;  // zero bytes where the character is '1'
+  const uint64_t low7 = 0x7F7F7F7F7F7F7F7Full;
+  const uint64_t nonZero = (((diff & low7) + low7) | diff) & 0x8080808080808080ull;
+  const uint64_t ones = (~nonZero & 0x8080808080808080ull) >> 7;
+  return static_cast<unsigned>((ones * 0x0102040810204080ull) >> 56);
+}
+
+/// The hexadecimal text of the `n` least significant bits of a packed vector (bit i in bit i mod
+/// 8 of byte i/8): ceil(n/4) upper-case digits, most significant first, the bits of the first
+/// digit above bit n-1 taken as zero.
+inline void packedHexText(const unsigned char* data, uint32_t n, std::string& text) {
+  const uint32_t digits = (n + 3) / 4;
+  text.resize(digits);
+  char* end = text.data() + digits;
+  const uint32_t whole = digits / 2;
+  for (uint32_t q = 0; q < whole; ++q) std::memcpy(end - 2 * q - 2, kByteDigits[data[q]].data(), 2);
+  if (digits % 2 != 0) text[0] = kHexDigits[data[whole] & 0x0Fu];
+  if (n % 4 != 0) text[0] = kHexDigits[hexDigitValue(text[0]) & ((1u << (n % 4)) - 1)];
 }
 
 /// Writes, piece by piece, the hexadecimal text of a bit text given in pieces: upper-case

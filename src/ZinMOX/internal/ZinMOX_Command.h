@@ -53,6 +53,10 @@ class ZinMOX_Command {
   /// Sets the step strings of synchronous outputs 0 to count-1 from 16 packed step vectors
   /// (vector t at byte t*ceil(count/8)): character t of output i's string is bit i of vector t.
   void setStepVectors(const uint8_t* vectors, uint32_t count);
+  /// Sets the step strings of `count` synchronous outputs from 16 packed step vectors given one
+  /// by one (`vectors[t]` is step t, bit i of it for value bit i): character t of the string of
+  /// output positions[i] (of output i when `positions` is null) is bit i of vector t.
+  void stageStepVectors(const uint8_t* const* vectors, const uint32_t* positions, uint32_t count);
   /// Holds one level on all steps of a synchronous output bit, without building a step string.
   void holdPulseTrain(uint32_t bit, char level) {
     std::string& steps = syncOutPulseTrains[bit];
@@ -119,6 +123,20 @@ class ZinMOX_Command {
   std::string syncInSyncActivityUpBits;
   std::string syncInSyncActivityDownBits;
   ZINMOX_CORE_INFO moxCoreInfo{};
+
+  // Storage reused from one transfer to the next, so that a transfer on a core of unchanged
+  // size allocates nothing; the lines that depend only on the reference are kept rendered.
+  struct RenderedLines {
+    std::string text;
+    ZIN_CORE_REF ref{};
+    uint32_t readBits = 0;
+    bool valid = false;
+  };
+  RenderedLines commitLine_;
+  RenderedLines readLines_;
+  std::string writeText_;
+  std::vector<unsigned char> readData_;
+  std::string readBitText_;
 };
 
 }  // namespace ZinRT
