@@ -88,16 +88,14 @@ Zin_ByteBuffer* Zin_ByteBuffer::hex2Bin(uint32_t first, uint32_t last) const {
   const char* text = ptr();
   unsigned char* bytes = bin->uPtr();
   // The last digit is the least significant: digit pairs fill the bytes from byte 0 upwards,
-  // eight digits (four bytes) at a time while they are all digits. The rest, and a word that
+  // sixteen digits (eight bytes) at a time while they are all digits. The rest, and a block that
   // holds a bad digit, go one digit at a time, so a bad digit is reported as the conversion
   // meets it, from the last digit on.
   uint32_t k = 0;
-  for (; digitCount - k >= 8; k += 8) {
-    const uint64_t word = detail::loadWord(text + last - k - 7);
-    if (!detail::isHexWord(word)) break;
-    const uint32_t pairs = detail::hexWordPairs(word);  // byte m: digits k+7-2m and k+6-2m
-    unsigned char* out = bytes + k / 2;
-    for (unsigned m = 0; m < 4; ++m) out[3 - m] = static_cast<unsigned char>(pairs >> (8 * m));
+  for (uint64_t pairs = 0; digitCount - k >= 16 && detail::hexPairs16(text + last - k - 15, pairs);
+       k += 16) {
+    unsigned char* out = bytes + k / 2;  // pair m goes to byte k/2 + 7 - m
+    for (unsigned m = 0; m < 8; ++m) out[7 - m] = static_cast<unsigned char>(pairs >> (8 * m));
   }
   for (; k < digitCount; ++k) {
     int v = detail::kHexValues[static_cast<unsigned char>(text[last - k])];

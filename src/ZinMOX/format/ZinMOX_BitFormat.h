@@ -11,6 +11,9 @@
 #include <cstdint>
 #include <cstring>
 #include <string>
+#if defined(__SSE2__)
+#include <emmintrin.h>
+#endif
 
 namespace ZinRT::mox {
 
@@ -88,6 +91,18 @@ inline bool isHexWord(uint64_t word) {
 /// Whether all `n` characters of `text` are hexadecimal digits of either case.
 inline bool allHexDigits(const char* text, size_t n) {
   size_t i = 0;
+#if defined(__SSE2__)
+  // Signed comparisons: a byte of 0x80 or more is below every bound and fails both ranges.
+  for (; n - i >= 16; i += 16) {
+    const __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(text + i));
+    const __m128i folded = _mm_or_si128(v, _mm_set1_epi8(0x20));  // 'A'-'F' become 'a'-'f'
+    const __m128i digit = _mm_and_si128(_mm_cmpgt_epi8(v, _mm_set1_epi8('0' - 1)),
+                                        _mm_cmplt_epi8(v, _mm_set1_epi8('9' + 1)));
+    const __m128i letter = _mm_and_si128(_mm_cmpgt_epi8(folded, _mm_set1_epi8('a' - 1)),
+                                         _mm_cmplt_epi8(folded, _mm_set1_epi8('f' + 1)));
+    if (_mm_movemask_epi8(_mm_or_si128(digit, letter)) != 0xFFFF) return false;
+  }
+#endif
   for (; n - i >= 8; i += 8) {
     if (!isHexWord(loadWord(text + i))) return false;
   }
@@ -123,6 +138,17 @@ inline unsigned onesWordLsbFirst(uint64_t word) {
   const uint64_t nonZero = (((diff & low7) + low7) | diff) & 0x8080808080808080ull;
   const uint64_t ones = (~nonZero & 0x8080808080808080ull) >> 7;
   return static_cast<unsigned>((ones * 0x0102040810204080ull) >> 56);
+}
+
+/// Two bytes whose bit k is 1 exactly where character k of the sixteen at `text` is '1' (the
+/// first character is bit 0).
+inline unsigned onesLsbFirst16(const char* text) {
+#if defined(__SSE2__)
+  const __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(text));
+  return static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(v, _mm_set1_epi8('1'))));
+#else
+  return onesWordLsbFirst(loadWord(text)) | (onesWordLsbFirst(loadWord(text + 8)) << 8);
+#endif
 }
 
 /// The hexadecimal text of the `n` least significant bits of a packed vector (bit i in bit i mod

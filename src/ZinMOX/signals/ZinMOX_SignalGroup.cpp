@@ -24,8 +24,11 @@ void collectBits(const std::string& image, const uint32_t* positions, uint32_t n
   const char* chars = image.data();
   uint32_t i = 0;
   if (contiguous) {  // positions[i] is positions[0] + i: eight characters at a time
-    for (const char* run = chars + (n != 0 ? positions[0] : 0); i + 8 <= n; i += 8) {
-      packed[i / 8] |= static_cast<uint8_t>(mox::onesWordLsbFirst(mox::loadWord(run + i)));
+    const char* run = chars + (n != 0 ? positions[0] : 0);
+    for (; i + 16 <= n; i += 16) {
+      const unsigned ones = mox::onesLsbFirst16(run + i);
+      packed[i / 8] |= static_cast<uint8_t>(ones);
+      packed[i / 8 + 1] |= static_cast<uint8_t>(ones >> 8);
     }
   }
   for (; i + 8 <= n; i += 8) {
