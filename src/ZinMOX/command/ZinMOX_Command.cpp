@@ -14,7 +14,6 @@ namespace ZinRT {
 
 namespace {
 
-constexpr char STEPS_OF_ZERO[] = "0000000000000000";
 // Bits per asynchronous and synchronous input bit in the read data.
 constexpr uint32_t ASYNC_IN_BITS = 4;
 constexpr uint32_t SYNC_IN_BITS = 6;
@@ -71,8 +70,7 @@ void ZinMOX_Command::initFromCoreInfo(const ZINMOX_CORE_INFO& info) {
   moxCoreInfo = info;
   asyncOutValueBits.append(info.async_output_count, '0');
   asyncOutUpdateBits.append(info.async_output_count, '0');
-  syncOutPulseTrains.insert(syncOutPulseTrains.end(), info.sync_output_count,
-                            std::string(STEPS_OF_ZERO));
+  syncOutSteps.append(static_cast<size_t>(info.sync_output_count) * STEP_COUNT, '0');
   syncOutUpdateBits.append(info.sync_output_count, '0');
   for (std::string* field : {&asyncInValueBits, &asyncInActivityUpBits, &asyncInActivityDownBits}) {
     field->append(info.async_input_count, '0');
@@ -86,6 +84,21 @@ void ZinMOX_Command::initFromCoreInfo(const ZINMOX_CORE_INFO& info) {
 void ZinMOX_Command::clearUpdateMasks() {
   asyncOutUpdateBits.assign(asyncOutUpdateBits.size(), '0');
   syncOutUpdateBits.assign(syncOutUpdateBits.size(), '0');
+}
+
+void ZinMOX_Command::stageAsyncRun(uint32_t first, const uint8_t* value, uint32_t n) {
+  char* chars = asyncOutValueBits.data() + first;
+  uint32_t i = 0;
+  for (; i + 8 <= n; i += 8) std::memcpy(chars + i, mox::kByteBitsLsbFirst[value[i / 8]].data(), 8);
+  for (; i < n; ++i) chars[i] = ((value[i / 8] >> (i % 8)) & 1u) != 0 ? '1' : '0';
+  std::memset(asyncOutUpdateBits.data() + first, '1', n);
+}
+
+void ZinMOX_Command::holdPulseTrainRun(uint32_t first, const uint8_t* value, uint32_t n) {
+  for (uint32_t i = 0; i < n; ++i) {
+    holdPulseTrain(first + i, ((value[i / 8] >> (i % 8)) & 1u) != 0 ? '1' : '0');
+  }
+  std::memset(syncOutUpdateBits.data() + first, '1', n);
 }
 
 std::string& ZinMOX_Command::buildCommandText(const ZIN_CORE_REF& coreRef, uint32_t code,
@@ -138,11 +151,8 @@ std::string& ZinMOX_Command::buildCommandText(const ZIN_CORE_REF& coreRef, uint3
 
 bool ZinMOX_Command::appendDataHex(std::string& text, size_t dataBits) const {
   mox::HexTextWriter writer(text, dataBits);
-  if (!writer.add(asyncOutValueBits)) return false;
-  for (const std::string& steps : syncOutPulseTrains) {
-    if (steps.size() != STEP_COUNT || !writer.addSteps(steps.data())) return false;
-  }
-  return writer.add(asyncOutUpdateBits) && writer.add(syncOutUpdateBits) && writer.done();
+  return writer.add(asyncOutValueBits) && writer.add(syncOutSteps) &&
+         writer.add(asyncOutUpdateBits) && writer.add(syncOutUpdateBits) && writer.done();
 }
 
 void ZinMOX_Command::writeOutputs(uint32_t handle, const ZIN_CORE_REF& coreRef) {

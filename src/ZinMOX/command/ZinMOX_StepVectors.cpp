@@ -66,7 +66,6 @@ void ZinMOX_Command::setStepVectors(const uint8_t* vectors, uint32_t count) {
 void ZinMOX_Command::stageStepVectors(const uint8_t* const* vectors, const uint32_t* positions,
                                       uint32_t count) {
   const uint32_t stepBytes = mox::byteCount(count);
-  std::string* trains = syncOutPulseTrains.data();
   ColumnSteps column;
   for (uint32_t byte = 0; byte < stepBytes; ++byte) {
     // Byte t of `early` is the column's byte of step t, byte t of `late` that of step 8 + t;
@@ -81,12 +80,7 @@ void ZinMOX_Command::stageStepVectors(const uint8_t* const* vectors, const uint3
     const uint32_t outputs = std::min<uint32_t>(8, count - 8 * byte);
     for (uint32_t b = 0; b < outputs; ++b) {
       const uint32_t bit = 8 * byte + b;
-      std::string& train = trains[positions != nullptr ? positions[bit] : bit];
-      if (train.size() == STEP_COUNT) {
-        std::memcpy(train.data(), column.steps[b], STEP_COUNT);
-      } else {
-        train.assign(column.steps[b], STEP_COUNT);
-      }
+      setPulseTrainSteps(positions != nullptr ? positions[bit] : bit, column.steps[b]);
     }
   }
 }

@@ -164,6 +164,15 @@ inline void packedHexText(const unsigned char* data, uint32_t n, std::string& te
   if (n % 4 != 0) text[0] = kHexDigits[hexDigitValue(text[0]) & ((1u << (n % 4)) - 1)];
 }
 
+/// Each byte value with its bits in reverse order.
+inline constexpr std::array<uint8_t, 256> kReversedBits = [] {
+  std::array<uint8_t, 256> table{};
+  for (unsigned b = 0; b < 256; ++b) {
+    for (unsigned k = 0; k < 8; ++k) table[b] |= static_cast<uint8_t>(((b >> k) & 1u) << (7 - k));
+  }
+  return table;
+}();
+
 /// Writes, piece by piece, the hexadecimal text of a bit text given in pieces: upper-case
 /// digits, most significant first, the whole bit text padded with zeros on the left to whole
 /// digits (the framework's binStr2HexStr of the concatenated pieces). The text's room is sized
@@ -184,6 +193,18 @@ class HexTextWriter {
     const char* p = bits.data();
     const char* end = p + bits.size();
     if ((pending_ + bits.size()) / 4 > static_cast<size_t>(end_ - next_)) return false;
+#if defined(__SSE2__)
+    for (; end - p >= 16; p += 16) {
+      const __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
+      const __m128i bitChars = _mm_cmpeq_epi8(_mm_and_si128(v, _mm_set1_epi8('\xFE')),
+                                              _mm_set1_epi8('0'));  // '0' and '1' only
+      if (_mm_movemask_epi8(bitChars) != 0xFFFF) return false;
+      const auto ones =
+          static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(v, _mm_set1_epi8('1'))));
+      pushByte(kReversedBits[ones & 0xFF]);  // character k is bit k: the first is the top bit
+      pushByte(kReversedBits[ones >> 8]);
+    }
+#endif
     for (; end - p >= 8; p += 8) {
       const uint64_t word = loadWord(p);
       if (!isBitWord(word)) return false;
@@ -211,7 +232,9 @@ class HexTextWriter {
   }
 
   /// Whether exactly the announced number of bits was added (every digit of the room written).
-  bool done() const { return next_ == end_ && pending_ == 0; }
+  bool done() const {
+    return next_ == end_ && pending_ == 0;
+  }
 
  private:
   // Fewer than four bits are pending: eight new ones complete exactly two digits.

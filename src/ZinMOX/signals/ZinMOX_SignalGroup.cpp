@@ -94,8 +94,14 @@ void ZinMOX_SignalGroup::setValues(const uint8_t* value, uint32_t byteSize, uint
   if (value == nullptr) throw std::logic_error("Null value for signal: " + getName());
   checkDirection(type, false, getName());
 
+  // A run of consecutive port bits (a bus or a whole port) is staged a byte at a time.
+  const bool run = n != 0 && isContiguous(positions.data(), n);
   if (type == Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_OUTPUT && stepCount <= 1) {
     if (byteSize < bytes) failTooSmall(getName());
+    if (run) {
+      command->holdPulseTrainRun(positions[0], value, n);
+      return;
+    }
     for (uint32_t i = 0; i < n; ++i) {
       command->holdPulseTrain(positions[i], packedBit(value, i) ? '1' : '0');
       command->setSyncOutUpdateChar(positions[i], '1');
@@ -115,6 +121,10 @@ void ZinMOX_SignalGroup::setValues(const uint8_t* value, uint32_t byteSize, uint
     for (uint32_t i = 0; i < n; ++i) command->setSyncOutUpdateChar(positions[i], '1');
   } else {
     if (byteSize < bytes) failTooSmall(getName());
+    if (run) {
+      command->stageAsyncRun(positions[0], value, n);
+      return;
+    }
     for (uint32_t i = 0; i < n; ++i) {
       command->setAsyncOutValueChar(positions[i], packedBit(value, i) ? '1' : '0');
       command->setAsyncOutUpdateChar(positions[i], '1');
