@@ -86,6 +86,18 @@ void ZinMOX_Command::clearUpdateMasks() {
   syncOutUpdateBits.assign(syncOutUpdateBits.size(), '0');
 }
 
+void ZinMOX_Command::setAsyncOutValueBits(const uint8_t* packed, uint32_t count) {
+  Zin_NumberUtil::bin2ReverseBinStr(packed, count, asyncOutValueBits);
+}
+
+void ZinMOX_Command::setAsyncOutUpdateBits(const uint8_t* packed, uint32_t count) {
+  Zin_NumberUtil::bin2ReverseBinStr(packed, count, asyncOutUpdateBits);
+}
+
+void ZinMOX_Command::setSyncOutUpdateBits(const uint8_t* packed, uint32_t count) {
+  Zin_NumberUtil::bin2ReverseBinStr(packed, count, syncOutUpdateBits);
+}
+
 void ZinMOX_Command::stageAsyncRun(uint32_t first, const uint8_t* value, uint32_t n) {
   char* chars = asyncOutValueBits.data() + first;
   uint32_t i = 0;

@@ -44,6 +44,11 @@ class ZinMOX_Command {
   void setAsyncOutValueBits(std::string bits) { asyncOutValueBits = std::move(bits); }
   void setAsyncOutUpdateBits(std::string bits) { asyncOutUpdateBits = std::move(bits); }
   void setSyncOutUpdateBits(std::string bits) { syncOutUpdateBits = std::move(bits); }
+  /// Sets the characters of a whole output string from `count` packed bits (bit i in bit i mod 8
+  /// of byte i/8), in place: the string keeps its storage.
+  void setAsyncOutValueBits(const uint8_t* packed, uint32_t count);
+  void setAsyncOutUpdateBits(const uint8_t* packed, uint32_t count);
+  void setSyncOutUpdateBits(const uint8_t* packed, uint32_t count);
   void setAsyncOutValueChar(uint32_t bit, char c) { asyncOutValueBits[bit] = c; }
   void setAsyncOutUpdateChar(uint32_t bit, char c) { asyncOutUpdateBits[bit] = c; }
   void setSyncOutUpdateChar(uint32_t bit, char c) { syncOutUpdateBits[bit] = c; }
