@@ -5,7 +5,7 @@
 
 #include "Commands.h"
 #include "Errors.h"
-#include "TargetOpen.h"
+#include "ZinHost/Target.h"
 #include "ZinNet/Endpoint.h"
 #include "ZinNet/Server.h"
 
@@ -26,7 +26,7 @@ void serve(Session& session, const std::string& listen) {
   ZinNet::ServerOptions options;
   options.host = endpoint.host;
   options.port = endpoint.port;
-  options.name = "zinmox serve: " + describeTarget(session.targetText());
+  options.name = "zinmox serve: " + ZinHost::describeTarget(session.targetText());
   options.stopOnSignals = true;
   // The server logs from its own thread: one flushed line per event, never mixed with ours.
   auto outputMutex = std::make_shared<std::mutex>();
@@ -34,7 +34,7 @@ void serve(Session& session, const std::string& listen) {
     std::lock_guard<std::mutex> lock(*outputMutex);
     std::cout << "zinmox serve: " << line << std::endl;
   };
-  ZinNet::Server server(openTarget(session.targetText()), options);
+  ZinNet::Server server(ZinHost::openTarget(session.targetText()).transport, options);
   try {
     server.start();
   } catch (const std::runtime_error& error) {
@@ -42,7 +42,7 @@ void serve(Session& session, const std::string& listen) {
   }
   {
     std::lock_guard<std::mutex> lock(*outputMutex);
-    std::cout << "zinmox serve: serving " << describeTarget(session.targetText())
+    std::cout << "zinmox serve: serving " << ZinHost::describeTarget(session.targetText())
               << "; connect with --target tcp://" << server.address() << "; Ctrl-C or SIGTERM stops"
               << std::endl;
   }
