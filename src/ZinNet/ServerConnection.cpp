@@ -9,9 +9,9 @@ namespace ZinNet {
 
 using Protocol::MessageType;
 
-ServerConnection::ServerConnection(std::shared_ptr<ServerCore> core, asio::ip::tcp::socket socket,
+ServerConnection::ServerConnection(std::shared_ptr<ServerState> state, asio::ip::tcp::socket socket,
                                    asio::any_io_executor requests, uint64_t id)
-    : core_(std::move(core)),
+    : state_(std::move(state)),
       socket_(std::move(socket)),
       timer_(socket_.get_executor()),
       requests_(std::move(requests)),
@@ -21,15 +21,15 @@ ServerConnection::ServerConnection(std::shared_ptr<ServerCore> core, asio::ip::t
   peer_ = ec ? std::string("an unknown peer")
              : remote.address().to_string() + ":" + std::to_string(remote.port());
   socket_.set_option(asio::ip::tcp::no_delay(true), ec);
-  ++core_->connectionsOpen;
+  ++state_->connectionsOpen;
 }
 
 ServerConnection::~ServerConnection() {
-  --core_->connectionsOpen;
+  --state_->connectionsOpen;
 }
 
 void ServerConnection::start() {
-  core_->log("connection " + std::to_string(id_) + " from " + peer_ + " opened");
+  state_->log("connection " + std::to_string(id_) + " from " + peer_ + " opened");
   readPrefix();
 }
 
@@ -40,18 +40,18 @@ void ServerConnection::close(const std::string& why) {
   timer_.cancel();
   socket_.shutdown(asio::ip::tcp::socket::shutdown_both, ec);
   socket_.close(ec);
-  core_->log("connection " + std::to_string(id_) + " closed after " +
+  state_->log("connection " + std::to_string(id_) + " closed after " +
              std::to_string(requestCount_) + " requests: " + why);
 }
 
 void ServerConnection::refuseAndClose(const std::string& why) {
-  core_->log("connection from " + peer_ + " refused: " + why);
+  state_->log("connection from " + peer_ + " refused: " + why);
   send(textFrame(MessageType::Closing, why), true);
 }
 
 void ServerConnection::refuse(const std::string& why, bool thenClose) {
-  ++core_->framesRefused;
-  core_->log("connection " + std::to_string(id_) + ": " + why);
+  ++state_->framesRefused;
+  state_->log("connection " + std::to_string(id_) + ": " + why);
   send(textFrame(thenClose ? MessageType::Closing : MessageType::Refused, why), thenClose);
 }
 
@@ -62,7 +62,7 @@ void ServerConnection::armTimer(uint32_t ms, const char* what) {
   timer_.expires_after(std::chrono::milliseconds(ms));
   timer_.async_wait([self = shared_from_this(), generation, ms, what](std::error_code ec) {
     if (ec || generation != self->timerGeneration_ || self->closed_) return;
-    ++self->core_->framesRefused;
+    ++self->state_->framesRefused;
     self->close(std::string(what) + " not done within " + std::to_string(ms) + " ms");
   });
 }
@@ -79,7 +79,7 @@ void ServerConnection::onReadError(std::error_code ec, const char* where) {
     close("the client closed the connection");
     return;
   }
-  ++core_->framesRefused;  // a truncated frame
+  ++state_->framesRefused;  // a truncated frame
   if (ended) {
     close(std::string("the client closed the connection ") + where);
   } else {
@@ -89,7 +89,7 @@ void ServerConnection::onReadError(std::error_code ec, const char* where) {
 
 void ServerConnection::readPrefix() {
   if (closed_) return;
-  if (prefixBytes_ == 0) armTimer(core_->options.idleTimeoutMs, "waiting for a frame");
+  if (prefixBytes_ == 0) armTimer(state_->options.idleTimeoutMs, "waiting for a frame");
   socket_.async_read_some(
       asio::buffer(prefix_.data() + prefixBytes_, prefix_.size() - prefixBytes_),
       [self = shared_from_this()](std::error_code ec, size_t n) { self->onPrefix(ec, n); });
@@ -100,7 +100,7 @@ void ServerConnection::onPrefix(std::error_code ec, size_t n) {
     onReadError(ec, prefixBytes_ == 0 ? "between frames" : "inside a frame's length");
     return;
   }
-  if (prefixBytes_ == 0 && n != 0) armTimer(core_->options.frameTimeoutMs, "a frame");
+  if (prefixBytes_ == 0 && n != 0) armTimer(state_->options.frameTimeoutMs, "a frame");
   prefixBytes_ += n;
   if (prefixBytes_ < prefix_.size()) {
     readPrefix();
@@ -110,9 +110,9 @@ void ServerConnection::onPrefix(std::error_code ec, size_t n) {
   const uint32_t length = decodeLength(prefix_.data());
   if (length == 0) {
     refuse("frame of length 0", true);
-  } else if (length > core_->options.maxFrameBytes) {
+  } else if (length > state_->options.maxFrameBytes) {
     refuse("frame of " + std::to_string(length) + " bytes exceeds the limit of " +
-               std::to_string(core_->options.maxFrameBytes) + " bytes",
+               std::to_string(state_->options.maxFrameBytes) + " bytes",
            true);
   } else {
     readBody(length);
@@ -169,28 +169,28 @@ void ServerConnection::onHello(const Frame& frame) {
   greeted_ = true;
   FrameWriter out(MessageType::Welcome);
   out.bytes(Protocol::kMagic, 4).u16(Protocol::kVersion);
-  out.u32(core_->options.maxFrameBytes).u32(core_->options.maxReadBytes);
-  send(out.text(boundedText(core_->options.name)).finish(), false);
+  out.u32(state_->options.maxFrameBytes).u32(state_->options.maxReadBytes);
+  send(out.text(boundedText(state_->options.name)).finish(), false);
 }
 
 void ServerConnection::runRequest(Frame frame) {
   // The request runs on the request executor; the reply comes back to the I/O thread.
   const MessageType type = frame.type;
   asio::post(requests_, [self = shared_from_this(), type, frame = std::move(frame)]() {
-    if (self->core_->stopping) return;
+    if (self->state_->stopping) return;
     Reply reply;
     {
-      std::lock_guard<std::mutex> lock(self->core_->requestMutex);
-      reply = carryOut(frame, *self->core_->transport, self->core_->options.maxReadBytes);
+      std::lock_guard<std::mutex> lock(self->state_->requestMutex);
+      reply = carryOut(frame, *self->state_->transport, self->state_->options.maxReadBytes);
     }
     asio::post(self->socket_.get_executor(), [self, type, reply = std::move(reply)]() mutable {
       if (reply.carriedOut) {
-        ++self->core_->requestsServed;
+        ++self->state_->requestsServed;
         ++self->requestCount_;
       }
       if (reply.refused) {
-        ++self->core_->framesRefused;
-        self->core_->log("connection " + std::to_string(self->id_) + ": refused a malformed " +
+        ++self->state_->framesRefused;
+        self->state_->log("connection " + std::to_string(self->id_) + ": refused a malformed " +
                          typeText(static_cast<uint8_t>(type)) + " request");
       }
       self->send(std::move(reply.bytes), false);
@@ -226,7 +226,7 @@ void ServerConnection::drain() {
 void ServerConnection::send(std::vector<unsigned char> bytes, bool thenClose) {
   if (closed_) return;
   outgoing_ = std::move(bytes);
-  armTimer(core_->options.writeTimeoutMs, "sending a reply");
+  armTimer(state_->options.writeTimeoutMs, "sending a reply");
   asio::async_write(socket_, asio::buffer(outgoing_),
                     [self = shared_from_this(), thenClose](std::error_code ec, size_t) {
                       if (self->closed_) return;

@@ -10,16 +10,16 @@
 
 #include "Asio.h"
 #include "Frame.h"
-#include "ServerCore.h"
+#include "ServerState.h"
 
 namespace ZinNet {
 
 /// Lives on the server's I/O thread; the requests themselves run on the request executor, one at
-/// a time under the core's request mutex. A connection reads its next frame only after the reply
+/// a time under the server's request mutex. A connection reads its next frame only after the reply
 /// to the previous one is written, so a client cannot queue up work on the server.
 class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
  public:
-  ServerConnection(std::shared_ptr<ServerCore> core, asio::ip::tcp::socket socket,
+  ServerConnection(std::shared_ptr<ServerState> state, asio::ip::tcp::socket socket,
                    asio::any_io_executor requests, uint64_t id);
   ~ServerConnection();
 
@@ -45,7 +45,7 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   void disarmTimer();
   void onReadError(std::error_code ec, const char* where);
 
-  std::shared_ptr<ServerCore> core_;
+  std::shared_ptr<ServerState> state_;
   asio::ip::tcp::socket socket_;
   asio::steady_timer timer_;
   asio::any_io_executor requests_;

@@ -1,7 +1,7 @@
 // What the connections of a server share: the served transport, its request mutex, the options,
 // the log and the counters.
-#ifndef ZINNET_SRC_SERVERCORE_H
-#define ZINNET_SRC_SERVERCORE_H
+#ifndef ZINNET_SRC_SERVERSTATE_H
+#define ZINNET_SRC_SERVERSTATE_H
 
 #include <atomic>
 #include <memory>
@@ -13,8 +13,8 @@
 
 namespace ZinNet {
 
-struct ServerCore {
-  ServerCore(std::shared_ptr<ZinRT::Zin_Transport> t, ServerOptions o)
+struct ServerState {
+  ServerState(std::shared_ptr<ZinRT::Zin_Transport> t, ServerOptions o)
       : transport(std::move(t)), options(std::move(o)) {}
 
   void log(const std::string& line);
