@@ -1,6 +1,7 @@
 // The server: listener, accept loop, I/O thread, request thread, signals and shutdown.
 #include "ZinNet/Server.h"
 
+#include <algorithm>
 #include <condition_variable>
 #include <csignal>
 #include <optional>
@@ -22,6 +23,7 @@ struct Server::Impl {
   void listen();
   void accept();
   void onAccepted(std::error_code ec, tcp::socket socket);
+  bool makeRoom();
   void watchSignals();
   void ioMain();
 
@@ -35,7 +37,7 @@ struct Server::Impl {
   std::thread ioThread;
   tcp::endpoint bound;
   uint64_t nextId = 1;
-  std::vector<std::weak_ptr<ServerConnection>> connections;  // I/O thread, then stop()
+  std::vector<std::weak_ptr<ServerConnection>> connections;
 
   mutable std::mutex stateMutex;
   std::condition_variable stoppedChanged;
@@ -90,14 +92,37 @@ void Server::Impl::onAccepted(std::error_code ec, tcp::socket socket) {
   auto connection = std::make_shared<ServerConnection>(state, std::move(socket),
                                                        requests.get_executor(), nextId++);
   std::erase_if(connections, [](const auto& weak) { return weak.expired(); });
+  const auto placesTaken = std::count_if(connections.begin(), connections.end(), [](auto& weak) {
+    const auto c = weak.lock();
+    return c && c->holdsPlace();
+  });
+  const bool full = static_cast<uint64_t>(placesTaken) >= state->options.maxClients && !makeRoom();
   connections.push_back(connection);
-  if (state->connectionsOpen > state->options.maxClients) {
+  if (full) {
     connection->refuseAndClose("the server is busy: " + std::to_string(state->options.maxClients) +
                                " clients are connected");
   } else {
     connection->start();
   }
   accept();
+}
+
+// Closes the connection that has waited longest for its next request, if any connection is
+// between requests; connections whose request is in progress keep their place.
+bool Server::Impl::makeRoom() {
+  std::shared_ptr<ServerConnection> oldest;
+  std::chrono::steady_clock::time_point oldestSince{};
+  for (const auto& weak : connections) {
+    std::chrono::steady_clock::time_point since{};
+    const auto c = weak.lock();
+    if (c && c->evictable(since) && (!oldest || since < oldestSince)) {
+      oldest = c;
+      oldestSince = since;
+    }
+  }
+  if (!oldest) return false;
+  oldest->close("closed to make room for a new client: it had waited longest for a request");
+  return true;
 }
 
 void Server::Impl::watchSignals() {

@@ -2,6 +2,7 @@
 #include "ServerConnection.h"
 
 #include <cstring>
+#include <utility>
 
 #include "RequestHandler.h"
 
@@ -30,7 +31,13 @@ ServerConnection::~ServerConnection() {
 
 void ServerConnection::start() {
   state_->log("connection " + std::to_string(id_) + " from " + peer_ + " opened");
+  armTimer(state_->options.greetingTimeoutMs, "the greeting");
   readPrefix();
+}
+
+bool ServerConnection::evictable(std::chrono::steady_clock::time_point& since) const {
+  since = lastExchange_;
+  return holdsPlace() && !inExchange_;
 }
 
 void ServerConnection::close(const std::string& why) {
@@ -45,6 +52,7 @@ void ServerConnection::close(const std::string& why) {
 }
 
 void ServerConnection::refuseAndClose(const std::string& why) {
+  leaving_ = true;
   state_->log("connection from " + peer_ + " refused: " + why);
   send(textFrame(MessageType::Closing, why), true);
 }
@@ -52,6 +60,7 @@ void ServerConnection::refuseAndClose(const std::string& why) {
 void ServerConnection::refuse(const std::string& why, bool thenClose) {
   ++state_->framesRefused;
   state_->log("connection " + std::to_string(id_) + ": " + why);
+  leaving_ = leaving_ || thenClose;
   send(textFrame(thenClose ? MessageType::Closing : MessageType::Refused, why), thenClose);
 }
 
@@ -89,7 +98,10 @@ void ServerConnection::onReadError(std::error_code ec, const char* where) {
 
 void ServerConnection::readPrefix() {
   if (closed_) return;
-  if (prefixBytes_ == 0) armTimer(state_->options.idleTimeoutMs, "waiting for a frame");
+  // Before the hello, the greeting timer armed at the start runs on.
+  if (prefixBytes_ == 0 && greeted_) {
+    armTimer(state_->options.idleTimeoutMs, "waiting for a frame");
+  }
   socket_.async_read_some(
       asio::buffer(prefix_.data() + prefixBytes_, prefix_.size() - prefixBytes_),
       [self = shared_from_this()](std::error_code ec, size_t n) { self->onPrefix(ec, n); });
@@ -100,7 +112,9 @@ void ServerConnection::onPrefix(std::error_code ec, size_t n) {
     onReadError(ec, prefixBytes_ == 0 ? "between frames" : "inside a frame's length");
     return;
   }
-  if (prefixBytes_ == 0 && n != 0) armTimer(state_->options.frameTimeoutMs, "a frame");
+  if (prefixBytes_ == 0 && n != 0 && greeted_) {
+    armTimer(state_->options.frameTimeoutMs, "a frame");
+  }
   prefixBytes_ += n;
   if (prefixBytes_ < prefix_.size()) {
     readPrefix();
@@ -127,10 +141,12 @@ void ServerConnection::readBody(uint32_t length) {
                        self->onReadError(ec, "inside a frame");
                        return;
                      }
+                     // The body moves on without a copy, and the buffer keeps no memory between
+                     // frames.
                      Frame frame;
                      frame.type = static_cast<MessageType>(self->body_.front());
-                     frame.body.assign(self->body_.begin() + 1, self->body_.end());
-                     self->body_.clear();
+                     self->body_.erase(self->body_.begin());
+                     frame.body = std::exchange(self->body_, {});
                      self->onFrame(std::move(frame));
                    });
 }
@@ -138,6 +154,7 @@ void ServerConnection::readBody(uint32_t length) {
 void ServerConnection::onFrame(Frame frame) {
   if (closed_) return;
   disarmTimer();
+  inExchange_ = true;
   if (!greeted_) {
     onHello(frame);
   } else if (frame.type == MessageType::Hello) {
@@ -236,6 +253,8 @@ void ServerConnection::send(std::vector<unsigned char> bytes, bool thenClose) {
                       } else if (thenClose) {
                         self->lingerAndClose();
                       } else {
+                        self->inExchange_ = false;
+                        self->lastExchange_ = std::chrono::steady_clock::now();
                         self->readPrefix();
                       }
                     });

@@ -3,6 +3,7 @@
 #define ZINNET_SRC_SERVERCONNECTION_H
 
 #include <array>
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -29,6 +30,11 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   void refuseAndClose(const std::string& why);
   /// Closes the socket now.
   void close(const std::string& why);
+  /// Whether the connection holds a place: open and not on its way out.
+  bool holdsPlace() const { return !closed_ && !leaving_; }
+  /// Whether it may be closed to make room: no request of it is queued, carried out or being
+  /// answered. `since` is when it last completed an exchange (or connected).
+  bool evictable(std::chrono::steady_clock::time_point& since) const;
 
  private:
   void readPrefix();
@@ -60,6 +66,9 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   static constexpr uint32_t kLingerMs = 1000;
   bool greeted_ = false;
   bool closed_ = false;
+  bool leaving_ = false;     // a closing frame is being sent
+  bool inExchange_ = false;  // a request is queued, carried out or answered
+  std::chrono::steady_clock::time_point lastExchange_ = std::chrono::steady_clock::now();
   uint64_t requestCount_ = 0;
 };
 

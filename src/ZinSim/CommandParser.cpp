@@ -165,6 +165,7 @@ class WorkCount {
 
 std::vector<CommandLine> parseCommandSequence(std::string_view text, CoreMap& cores) {
   std::vector<CommandLine> lines;
+  lines.reserve(static_cast<size_t>(std::count(text.begin(), text.end(), '\n')) + 1);
   WorkCount work;
   size_t start = 0;
   for (size_t number = 1;; ++number) {
