@@ -184,6 +184,7 @@ void Server::stop() {
   impl_->io.stop();
   if (impl_->ioThread.joinable()) impl_->ioThread.join();
   impl_->requests.join();  // a request in progress finishes; the queued ones are skipped
+  impl_->state->waiting.clear();
   // The I/O thread is gone: close what it left open, so clients see the end at once.
   std::error_code ec;
   if (impl_->acceptor) impl_->acceptor->close(ec);

@@ -192,8 +192,10 @@ void ServerConnection::onHello(const Frame& frame) {
 
 void ServerConnection::runRequest(Frame frame) {
   // The request runs on the request executor; the reply comes back to the I/O thread.
+  // Each post takes one request from the queue, the small ones first.
   const MessageType type = frame.type;
-  asio::post(requests_, [self = shared_from_this(), type, frame = std::move(frame)]() {
+  const size_t bodyBytes = frame.body.size();
+  state_->waiting.push(bodyBytes, [self = shared_from_this(), type, frame = std::move(frame)]() {
     if (self->state_->stopping) return;
     Reply reply;
     {
@@ -212,6 +214,9 @@ void ServerConnection::runRequest(Frame frame) {
       }
       self->send(std::move(reply.bytes), false);
     });
+  });
+  asio::post(requests_, [state = state_]() {
+    if (auto job = state->waiting.pop()) job();
   });
 }
 

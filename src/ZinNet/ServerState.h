@@ -9,6 +9,7 @@
 #include <string>
 
 #include "Asio.h"
+#include "RequestQueue.h"
 #include "ZinNet/Server.h"
 
 namespace ZinNet {
@@ -23,6 +24,7 @@ struct ServerState {
   std::shared_ptr<ZinRT::Zin_Transport> transport;
   const ServerOptions options;
   std::mutex requestMutex;  // held for each request carried out on the transport
+  RequestQueue waiting;     // requests handed to the request thread, not yet begun
   std::mutex logMutex;
   std::atomic<bool> stopping{false};
   std::atomic<uint64_t> connectionsAccepted{0};

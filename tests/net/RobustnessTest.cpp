@@ -4,6 +4,7 @@
 
 #include <filesystem>
 #include <fstream>
+#include <atomic>
 #include <random>
 #include <thread>
 
@@ -77,6 +78,7 @@ TEST(Robustness, AHalfSentFrameTimesOutWhileOthersAreServed) {
   EXPECT_FALSE(idle.closedWithin(milliseconds(300)));
   EXPECT_TRUE(idle.closedWithin(milliseconds(3000)));
   EXPECT_TRUE(silent.closedWithin(milliseconds(100)));
+  EXPECT_TRUE(server.waitUntilNoConnections(milliseconds(2000)));
   for (const char* expected : {"a frame not done within 300 ms", "the greeting not done within 400 ms",
                                "waiting for a frame not done within 600 ms"}) {
     bool logged = false;
@@ -150,6 +152,50 @@ TEST(Robustness, SilentConnectionsCannotLockOthersOut) {
       std::chrono::duration_cast<milliseconds>(std::chrono::seconds(4) - elapsed())));
   EXPECT_TRUE(crowd[1]->closedWithin(milliseconds(4000)));
   EXPECT_TRUE(crowd[63]->closedWithin(milliseconds(1000)));
+}
+
+// With the default limits: while three clients send maximal sequences (4 MiB of commit lines, and
+// 4 MiB of full-width write and commit pairs) to a core with four 65535-bit ports, another
+// client's status reads are answered within its default 10 s request timeout.
+TEST(Robustness, MaximalSequencesDoNotStarveOtherClients) {
+  ZinSim::TargetDescription big;
+  big.cores.push_back(ZinSim::CoreDescription{});
+  big.cores[0].asyncInputs = big.cores[0].syncInputs = 65535;
+  big.cores[0].asyncOutputs = big.cores[0].syncOutputs = 65535;
+  TestServer server(std::make_shared<ZinSim::Target>(big));
+  const uint32_t maxText = ZinNet::ServerOptions{}.maxFrameBytes - 5;
+  const std::string commit = "00 0 0 02 0 00000004 0";
+  const std::string pair = "00 0 0 01 0 0012FFEE " + std::string(311292, '0') + "\n" + commit;
+  std::vector<std::string> floods;
+  for (const std::string* line : {&commit, &pair, &commit}) {
+    std::string text = *line;
+    while (text.size() + 1 + line->size() <= maxText) text += "\n" + *line;
+    floods.push_back(text);
+  }
+  std::atomic<bool> stop{false};
+  std::vector<std::thread> hostile;
+  for (const std::string& text : floods) {
+    hostile.emplace_back([&, request = frame(kSequence, concat({u32(0), ZinNetTest::text(text)}))] {
+      RawClient client(server.port());
+      client.greet();
+      while (!stop) {
+        client.send(request);
+        const auto reply = client.readFrame(std::chrono::seconds(60));
+        ASSERT_TRUE(reply.has_value());
+        EXPECT_EQ(reply->type, kReadData) << reply->text();
+      }
+    });
+  }
+  ZinNet::TcpTransport other("127.0.0.1", server.port());
+  for (int i = 0; i < 10; ++i) {
+    ZIN_CORE_INFO info{};
+    std::vector<unsigned char> status(16);
+    EXPECT_NO_THROW(other.readStatus({0, 0, 0}, info, status.data(), 16, 128));
+    EXPECT_EQ(info.coreType, 9u);
+    std::this_thread::sleep_for(milliseconds(50));
+  }
+  stop = true;
+  for (std::thread& t : hostile) t.join();
 }
 
 // Sends `bytes`, stops sending, and reads until the server closes: every frame it sends on the
