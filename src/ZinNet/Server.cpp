@@ -67,8 +67,8 @@ void Server::Impl::listen() {
   if (ec) throw std::runtime_error("ZinNet: cannot listen on " + where + ": " + ec.message());
   const bool loopback = bound.address().is_loopback();
   state->log("listening on " + bound.address().to_string() + ":" + std::to_string(bound.port()) +
-            (loopback ? " (loopback only: other machines cannot connect)"
-                      : " (open to other machines: whoever reaches this port drives the target)"));
+             (loopback ? " (loopback only: other machines cannot connect)"
+                       : " (open to other machines: whoever reaches this port drives the target)"));
 }
 
 void Server::Impl::accept() {

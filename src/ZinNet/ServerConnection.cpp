@@ -48,7 +48,7 @@ void ServerConnection::close(const std::string& why) {
   socket_.shutdown(asio::ip::tcp::socket::shutdown_both, ec);
   socket_.close(ec);
   state_->log("connection " + std::to_string(id_) + " closed after " +
-             std::to_string(requestCount_) + " requests: " + why);
+              std::to_string(requestCount_) + " requests: " + why);
 }
 
 void ServerConnection::refuseAndClose(const std::string& why) {
@@ -210,7 +210,7 @@ void ServerConnection::runRequest(Frame frame) {
       if (reply.refused) {
         ++self->state_->framesRefused;
         self->state_->log("connection " + std::to_string(self->id_) + ": refused a malformed " +
-                         typeText(static_cast<uint8_t>(type)) + " request");
+                          typeText(static_cast<uint8_t>(type)) + " request");
       }
       self->send(std::move(reply.bytes), false);
     });

@@ -2,9 +2,9 @@
 // crowd the server. The server answers or closes, never crashes or hangs, and keeps serving.
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <filesystem>
 #include <fstream>
-#include <atomic>
 #include <random>
 #include <thread>
 
@@ -79,8 +79,9 @@ TEST(Robustness, AHalfSentFrameTimesOutWhileOthersAreServed) {
   EXPECT_TRUE(idle.closedWithin(milliseconds(3000)));
   EXPECT_TRUE(silent.closedWithin(milliseconds(100)));
   EXPECT_TRUE(server.waitUntilNoConnections(milliseconds(2000)));
-  for (const char* expected : {"a frame not done within 300 ms", "the greeting not done within 400 ms",
-                               "waiting for a frame not done within 600 ms"}) {
+  for (const char* expected :
+       {"a frame not done within 300 ms", "the greeting not done within 400 ms",
+        "waiting for a frame not done within 600 ms"}) {
     bool logged = false;
     for (const std::string& line : server.log()) {
       logged = logged || line.find(expected) != std::string::npos;

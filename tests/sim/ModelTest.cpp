@@ -316,8 +316,8 @@ TEST(ModelLargeCore, WholePortsOfTheLargestWidthRoundTrip) {
 // repeats are exactly the work limit, one more line is beyond it.
 TEST(ModelLargeCore, SequenceWorkAndTheCommandLogAreBounded) {
   auto target = ZinSimTest::targetWith({moxCore({0, 0, 0}, 65535, 0, 65535, 0)});
-  const std::string pair = "00 0 0 01 0 0001FFFF 3" + std::string(32767, 'F') + "\n" +
-                           "00 0 0 02 0 00000004 0\n";
+  const std::string pair =
+      "00 0 0 01 0 0001FFFF 3" + std::string(32767, 'F') + "\n" + "00 0 0 02 0 00000004 0\n";
   std::string text;
   for (int i = 0; i < 256; ++i) text += pair;
   for (int i = 0; i < 256; ++i) text += "00 0 0 02 0 00000004 0\n";

@@ -224,8 +224,8 @@ TEST(ThreadStress, ClosingASessionWhileThreadsCallOnItFailsTheLaterCalls) {
             : kind == 2 ? ZinMOX_defineBus(handle, &r, "s", ZINMOX_ASYNC_OUTPUT, bits, 2)
             : kind == 3 ? ZinMOX_readValues(handle, &r, &word)
             : kind == 4 ? ZinMOX_writeValues(handle, &r, &word)
-                        : ZinMOX_getPortBits(handle, &r, out[0], out[1], out[2], 16, out[3],
-                                             out[4], out[5], out[6], out[7], 12);
+                        : ZinMOX_getPortBits(handle, &r, out[0], out[1], out[2], 16, out[3], out[4],
+                                             out[5], out[6], out[7], 12);
         if ((result != 0 && result != kFailure) || (after && result != kFailure)) ++badResults;
         delivered.clear();
         if (after) ++afterClose;
