@@ -253,6 +253,7 @@ void ServerConnection::send(std::vector<unsigned char> bytes, bool thenClose) {
                     [self = shared_from_this(), thenClose](std::error_code ec, size_t) {
                       if (self->closed_) return;
                       self->disarmTimer();
+                      self->outgoing_ = {};  // no reply is kept between requests
                       if (ec) {
                         self->close("write failed: " + ec.message());
                       } else if (thenClose) {
