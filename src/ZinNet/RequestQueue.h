@@ -1,6 +1,7 @@
-// The requests waiting for the server's request thread, in two lanes: small requests go before
-// large ones, so that a client with a status read or a short sequence waits for at most the one
-// large request in progress, however many clients flood the server with large sequences.
+// The requests waiting for the server's request thread, in two lanes that take turns when both
+// hold requests: a client with a status read or a short sequence waits for the small requests
+// ahead of it and as many large ones at most, however many clients flood the server with large
+// sequences, and clients with small requests cannot starve the large ones either.
 #ifndef ZINNET_SRC_REQUESTQUEUE_H
 #define ZINNET_SRC_REQUESTQUEUE_H
 
@@ -28,10 +29,11 @@ class RequestQueue {
     large_.clear();
   }
 
-  /// The oldest small request, else the oldest large one; null when none waits.
+  /// The oldest request of the lane whose turn it is, else of the other; null when none waits.
   std::function<void()> pop() {
     std::lock_guard<std::mutex> lock(mutex_);
-    std::deque<std::function<void()>>& lane = small_.empty() ? large_ : small_;
+    lastSmall_ = !small_.empty() && (!lastSmall_ || large_.empty());
+    std::deque<std::function<void()>>& lane = lastSmall_ ? small_ : large_;
     if (lane.empty()) return nullptr;
     std::function<void()> job = std::move(lane.front());
     lane.pop_front();
@@ -42,6 +44,7 @@ class RequestQueue {
   std::mutex mutex_;
   std::deque<std::function<void()>> small_;
   std::deque<std::function<void()>> large_;
+  bool lastSmall_ = false;  // the lane of the last request taken
 };
 
 }  // namespace ZinNet
