@@ -11,6 +11,7 @@ set(ENV{PKG_CONFIG_PATH} ${prefix}/lib/pkgconfig)
 # consumer, whose runtime must come first).
 execute_process(COMMAND ${CMAKE_COMMAND} -S ${CONSUMER_SOURCE} -B ${WORK_DIR}/build
   -DCMAKE_PREFIX_PATH=${prefix} -DCMAKE_BUILD_TYPE=Release
+  -DEXAMPLE_SOURCE=${EXAMPLE_SOURCE}
   "-DCMAKE_CXX_FLAGS=${CONSUMER_CXX_FLAGS}" "-DCMAKE_C_FLAGS=${CONSUMER_CXX_FLAGS}"
   "-DCMAKE_EXE_LINKER_FLAGS=${CONSUMER_LINKER_FLAGS}" RESULT_VARIABLE rc)
 if(rc)
@@ -20,7 +21,7 @@ execute_process(COMMAND ${CMAKE_COMMAND} --build ${WORK_DIR}/build RESULT_VARIAB
 if(rc)
   message(FATAL_ERROR "consumer build failed: ${rc}")
 endif()
-foreach(exe consumer_cmake consumer_pkgconfig)
+foreach(exe consumer_cmake consumer_pkgconfig consumer_info_example)
   execute_process(COMMAND ${WORK_DIR}/build/${exe} RESULT_VARIABLE rc)
   if(rc)
     message(FATAL_ERROR "${exe} failed: ${rc}")
