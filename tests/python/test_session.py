@@ -66,6 +66,9 @@ def test_description_dict_and_file(tmp_path):
         zinmox.Session(broken)
     with pytest.raises(ValueError, match="missing.json"):
         zinmox.Session(str(tmp_path / "missing.json"))
+    path.write_text('{"devices": [], "name": ' + "[" * 70000 + "]" * 70000 + "}")
+    with pytest.raises(ValueError, match="nested deeper than 32 levels"):
+        zinmox.Session(path)
 
 
 def test_core_references_as_sequences():

@@ -164,4 +164,32 @@ TEST(ThreadStress, ThreadsOnSharedAndSeparateSessionsKeepTheirMessagesApart) {
   }
 }
 
+// A close waits for the call in progress on another thread instead of destroying its core under
+// it, and a call after the close fails cleanly.
+TEST(ThreadStress, CloseWaitsForTheCallInProgressAndLaterCallsFail) {
+  ZIN_CORE_REF ref{1, 2, 0};
+  const auto transport = moxTarget({ref});
+  const uint32_t handle = ZinJtag_openSession(transport);
+  ZinJtag_setMessageHandler(handle, &recordOnThisThread, nullptr);
+  ASSERT_EQ(ZinMOX_initCore(handle, &ref), 0u);
+  ZinRT::ZinMOX_ValueMap map;
+  uintptr_t word = reinterpret_cast<uintptr_t>(&map);
+  transport->blockNextCommand();
+  std::atomic<uint32_t> readResult{1};
+  std::thread reader([&] { readResult = ZinMOX_readValues(handle, &ref, &word); });
+  ASSERT_TRUE(transport->waitUntilBlocked(5000));
+  std::atomic<bool> closed{false};
+  std::thread closer([&] {
+    ZinJtag_closeSession(handle);
+    closed = true;
+  });
+  std::this_thread::sleep_for(std::chrono::milliseconds(200));
+  EXPECT_FALSE(closed) << "the close did not wait for the call in progress";
+  transport->release();
+  reader.join();
+  closer.join();
+  EXPECT_EQ(readResult, 0u);
+  EXPECT_EQ(ZinMOX_readValues(handle, &ref, &word), kFailure);
+}
+
 }  // namespace
