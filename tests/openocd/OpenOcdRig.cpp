@@ -29,12 +29,9 @@ std::string OpenOcdRig::log() const {
 bool OpenOcdRig::startRtlsim() {
   rtlsim_ = std::make_unique<ChildProcess>(
       ZINMOX_RTLSIM_PATH, std::vector<std::string>{"--port", "0", "--idle-timeout", "0"});
-  if (!rtlsim_->waitForOutput("\n", kStartMs)) return false;
-  std::smatch match;
-  const std::string& out = rtlsim_->output();
-  if (!std::regex_search(out, match, std::regex("127\\.0\\.0\\.1:([0-9]+)"))) return false;
-  rtlsimPort_ = std::stoi(match[1].str());
-  return true;
+  const std::string port = rtlsim_->waitForMatch(std::regex("127\\.0\\.0\\.1:([0-9]+)"), kStartMs);
+  rtlsimPort_ = port.empty() ? -1 : std::stoi(port);
+  return rtlsimPort_ > 0;
 }
 
 bool OpenOcdRig::startOpenOcd() {

@@ -5,9 +5,13 @@
 #include <memory>
 #include <string>
 
-#include "ChildProcess.h"
+#include "support/ChildProcess.h"
 
 namespace ZinRtlTest {
+
+using ZinTest::ChildProcess;
+using ZinTest::connectLoopback;
+using ZinTest::freeLoopbackPort;
 
 class OpenOcdRig {
  public:
