@@ -80,7 +80,18 @@ if(TARGET zinmox_python)
 endif()
 configure_file(${PROJECT_SOURCE_DIR}/cmake/ZinPackageDepends.cmake.in
   ${PROJECT_BINARY_DIR}/ZinPackageDepends.cmake.in @ONLY)
-file(GENERATE OUTPUT ${PROJECT_BINARY_DIR}/ZinPackageDepends.cmake
+# One file per configuration (multi-configuration generators package the one cpack -C names).
+file(GENERATE OUTPUT ${PROJECT_BINARY_DIR}/ZinPackageDepends-$<CONFIG>.cmake
   INPUT ${PROJECT_BINARY_DIR}/ZinPackageDepends.cmake.in)
+string(REPLACE "@DIR@" "${PROJECT_BINARY_DIR}" zin_depends_loader [=[
+if(CPACK_BUILD_CONFIG)
+  include("@DIR@/ZinPackageDepends-${CPACK_BUILD_CONFIG}.cmake")
+else()
+  file(GLOB zin_depends "@DIR@/ZinPackageDepends-*.cmake")
+  list(GET zin_depends 0 zin_depends)
+  include("${zin_depends}")
+endif()
+]=])
+file(WRITE ${PROJECT_BINARY_DIR}/ZinPackageDepends.cmake "${zin_depends_loader}")
 set(CPACK_PROJECT_CONFIG_FILE ${PROJECT_BINARY_DIR}/ZinPackageDepends.cmake)
 include(CPack)

@@ -69,7 +69,7 @@ def system_module_dir(prefix):
 
 def installed(args):
     prefix = os.path.join(args.work_dir, "prefix")
-    run(["cmake", "--install", args.build_dir, "--prefix", prefix])
+    run(["cmake", "--install", args.build_dir, "--config", args.config, "--prefix", prefix])
     python_dir = os.path.join(prefix, args.python_dir)
     check(os.path.realpath(python_dir) == os.path.realpath(system_module_dir(prefix)),
           "module folder %s is not the interpreter's %s" % (python_dir, system_module_dir(prefix)))
@@ -160,8 +160,8 @@ def check_contents(debs, args):
 
 def packages(args):
     out = os.path.join(args.work_dir, "out")
-    run(["cpack", "-G", "DEB", "--config", os.path.join(args.build_dir, "CPackConfig.cmake"),
-         "-B", out])
+    run(["cpack", "-G", "DEB", "-C", args.config, "-B", out,
+         "--config", os.path.join(args.build_dir, "CPackConfig.cmake")])
     debs = {deb_field(d, "Package"): d for d in glob.glob(os.path.join(out, "*.deb"))}
     check(set(debs) == set(expected_files("", "", "1")), "packages: %s" % sorted(debs))
     fields = {}
@@ -188,7 +188,8 @@ def packages(args):
 def main():
     parser = argparse.ArgumentParser(description=__doc__.splitlines()[0])
     parser.add_argument("mode", choices=["installed", "packages"])
-    for option in ("--build-dir", "--work-dir", "--version", "--libdir", "--python-dir"):
+    for option in ("--build-dir", "--work-dir", "--version", "--libdir", "--python-dir",
+                   "--config"):
         parser.add_argument(option, required=True)
     args = parser.parse_args()
     shutil.rmtree(args.work_dir, ignore_errors=True)
