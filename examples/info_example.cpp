@@ -1,11 +1,12 @@
-// A minimal host: open a session on a scripted target with one MOX core, ask whether it is a MOX
-// core, and print its decoded information.
+// A complete host: opens a session on the simulated demo design, prints a MOX core's decoded
+// information, writes a named output and reads it back through the design's loopback wiring, and
+// shows how a failure is reported. Builds against the installed headers and libraries alone.
 #include <cstdio>
 #include <memory>
 
 #include "ZinMOX/ZinMOX.h"
 #include "ZinRT/ZinJtag.h"
-#include "ZinTarget/ScriptedTransport.h"
+#include "ZinSim/Target.h"
 
 namespace {
 
@@ -13,25 +14,8 @@ void printMessage(void*, uint32_t handle, uint32_t code, const char* text) {
   std::fprintf(stderr, "session %u, code %u: %s\n", handle, code, text);
 }
 
-}  // namespace
-
-int main() {
-  auto target = std::make_shared<ZinTarget::ScriptedTransport>();
-  ZIN_CORE_REF ref{1, 2, 0};
-  ZinTarget::MoxStatus status;
-  status.majorVersion = 10;
-  status.minorVersion = 2;
-  status.asyncInputCount = 16;
-  status.syncInputCount = 12;
-  status.asyncOutputCount = 16;
-  status.syncOutputCount = 8;
-  status.qxMajorVersion = 1;
-  status.qxMinorVersion = 4;
-  target->placeMoxCore(ref, status);
-
-  const uint32_t handle = ZinJtag_openSession(target);
-  ZinJtag_setMessageHandler(handle, printMessage, nullptr);
-
+int run(uint32_t handle) {
+  ZIN_CORE_REF ref{0, 1, 0};  // device 0, user chain 1, core 0 of the demo design
   uint32_t isMox = 0;
   ZinMOX_isMOXCore(handle, &ref, &isMox);
   std::printf("core %u:%u:%u is %sa MOX core\n", ref.deviceIndex, ref.userChainNumber,
@@ -48,10 +32,34 @@ int main() {
       info.async_input_count, info.sync_input_count, info.async_output_count,
       info.sync_output_count);
 
-  ZIN_CORE_REF empty{0, 0, 5};
+  // The demo design loops asynchronous output bit i back to asynchronous input bit i.
+  const uint32_t bits[] = {0, 1, 2, 3, 4, 5, 6, 7};
+  if (ZinMOX_initCore(handle, &ref) != ZINMOX_SUCCESS ||
+      ZinMOX_defineBus(handle, &ref, "leds", ZINMOX_ASYNC_OUTPUT, bits, 8) != ZINMOX_SUCCESS ||
+      ZinMOX_defineBus(handle, &ref, "leds_in", ZINMOX_ASYNC_INPUT, bits, 8) != ZINMOX_SUCCESS) {
+    return 1;
+  }
+  ZinRT::ZinMOX_ValueMap values{{"leds", "A5"}};
+  auto word = reinterpret_cast<uintptr_t>(&values);
+  if (ZinMOX_writeValues(handle, &ref, &word) != ZINMOX_SUCCESS) return 1;
+  ZinRT::ZinMOX_ValueMap inputs;
+  word = reinterpret_cast<uintptr_t>(&inputs);
+  if (ZinMOX_readValues(handle, &ref, &word) != ZINMOX_SUCCESS) return 1;
+  std::printf("wrote leds=A5, read leds_in=%s\n", inputs["leds_in"].c_str());
+  if (inputs["leds_in"] != "A5") return 1;
+
+  ZIN_CORE_REF empty{0, 1, 9};
   std::printf("asking for the information of an empty reference reports:\n");
   std::fflush(stdout);
-  ZinMOX_getInfo(handle, &empty, &info);
+  return ZinMOX_getInfo(handle, &empty, &info) == ZINMOX_FAILURE ? 0 : 1;
+}
+
+}  // namespace
+
+int main() {
+  const uint32_t handle = ZinJtag_openSession(std::make_shared<ZinSim::Target>());
+  ZinJtag_setMessageHandler(handle, printMessage, nullptr);
+  const int status = run(handle);
   ZinJtag_closeSession(handle);
-  return 0;
+  return status;
 }

@@ -11,6 +11,7 @@
 #include "FuzzSession.h"
 #include "ZinMOX/ZinMOX_Core.h"
 #include "ZinRT/Zin_CoreList.h"
+#include "internal/ZinMOX_CoreParts.h"
 
 using namespace ZinFuzz;
 
@@ -140,7 +141,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
       auto* core =
           dynamic_cast<ZinRT::ZinMOX_Core*>(ZinRT::Zin_CoreList::getCore(session.handle(), ref));
       if (core == nullptr) fail("the core is gone after a write");
-      checkStaged(core->getCommand(), found->second, bits);
+      checkStaged(ZinRT::ZinMOX_CoreAccess::command(*core), found->second, bits);
     }
   }
 

@@ -3,13 +3,12 @@
 #define ZINMOX_CORE_H
 
 #include <cstdint>
+#include <memory>
 #include <string>
 #include <vector>
 
-#include "ZinMOX/ZinMOX_Command.h"
 #include "ZinMOX/ZinMOX_CoreInfo.h"
 #include "ZinMOX/ZinMOX_Export.h"
-#include "ZinMOX/ZinMOX_SignalTable.h"
 #include "ZinMOX/ZinMOX_ValueMap.h"
 #include "ZinRT/Zin_ByteBuffer.h"
 #include "ZinRT/Zin_SignalCore.h"
@@ -117,8 +116,6 @@ class ZINMOX_API ZinMOX_Core : public Zin_SignalCore {
 
   /// The decoded information (all zero before initFromStatusWord).
   const ZINMOX_CORE_INFO& getMoxCoreInfo() const { return moxCoreInfo; }
-  /// The port image.
-  const ZinMOX_Command& getCommand() const { return command; }
 
  protected:
   void setCorePhysicalSignalCounts() override;
@@ -129,10 +126,14 @@ class ZINMOX_API ZinMOX_Core : public Zin_SignalCore {
   ZINMOX_HIDDEN ZinMOX_SignalGroup* requireOutputSignal(const std::string& name);
   ZINMOX_HIDDEN ZinMOX_SignalGroup* requireInputSignal(const std::string& name);
 
+  // The port image and the two signal tables are of the library's own types, which a host
+  // cannot use: they stay behind one pointer, so this declaration names nothing a host would
+  // have to link.
+  struct Parts;
+  friend struct ZinMOX_CoreAccess;
+
   ZINMOX_CORE_INFO moxCoreInfo;
-  ZinMOX_Command command;
-  ZinMOX_SignalTable inputSignals;
-  ZinMOX_SignalTable outputSignals;
+  std::unique_ptr<Parts> parts;
 };
 
 }  // namespace ZinRT

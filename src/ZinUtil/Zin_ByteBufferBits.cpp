@@ -6,7 +6,7 @@
 #include <string>
 
 #include "ZinRT/Zin_ByteBuffer.h"
-#include "Zin_HexDigits.h"
+#include "Zin_Format.h"
 
 namespace ZinRT {
 
@@ -43,9 +43,7 @@ void Zin_ByteBuffer::bin2HexString(uint32_t start, Zin_ByteBuffer& out) const {
   const unsigned char* bytes = uPtr() + start;
   char* digits = out.ptr();
   for (uint32_t i = 0; i < count; ++i) {
-    const unsigned char b = bytes[count - 1 - i];
-    digits[2 * i] = detail::kHexDigits[b >> 4];
-    digits[2 * i + 1] = detail::kHexDigits[b & 0x0F];
+    std::memcpy(digits + 2 * i, detail::kByteDigits[bytes[count - 1 - i]].data(), 2);
   }
 }
 
@@ -60,9 +58,8 @@ Zin_ByteBuffer* Zin_ByteBuffer::bin2HexString(uint32_t start, uint32_t bitCount)
   const uint32_t wholeBytes = static_cast<uint32_t>(std::min<uint64_t>(digitCount / 2, available));
   char* end = digits + digitCount;
   for (uint32_t i = 0; i < wholeBytes; ++i) {
-    const unsigned char b = bytes[start + i];
-    end[-2 * static_cast<int64_t>(i) - 1] = detail::kHexDigits[b & 0x0F];
-    end[-2 * static_cast<int64_t>(i) - 2] = detail::kHexDigits[b >> 4];
+    std::memcpy(end - 2 * static_cast<int64_t>(i) - 2, detail::kByteDigits[bytes[start + i]].data(),
+                2);
   }
   for (uint32_t k = 2 * wholeBytes; k < digitCount; ++k) {
     const uint64_t index = static_cast<uint64_t>(start) + k / 2;

@@ -9,40 +9,11 @@
 #include <functional>
 #include <stdexcept>
 
-#include "Zin_BitWords.h"
-#include "Zin_HexDigits.h"
+#include "Zin_Format.h"
 
 namespace ZinRT {
 
 namespace {
-
-// The reverse bit text of each byte value: character i is bit i.
-constexpr std::array<std::array<char, 8>, 256> kReverseBits = [] {
-  std::array<std::array<char, 8>, 256> table{};
-  for (unsigned b = 0; b < 256; ++b) {
-    for (unsigned i = 0; i < 8; ++i) table[b][i] = ((b >> i) & 1u) != 0 ? '1' : '0';
-  }
-  return table;
-}();
-
-// The four-character bit text of each digit value, most significant bit first.
-constexpr std::array<std::array<char, 4>, 16> kDigitBits = [] {
-  std::array<std::array<char, 4>, 16> table{};
-  for (unsigned v = 0; v < 16; ++v) {
-    for (unsigned j = 0; j < 4; ++j) table[v][j] = ((v >> (3 - j)) & 1u) != 0 ? '1' : '0';
-  }
-  return table;
-}();
-
-// The two hexadecimal digits of each byte value.
-constexpr std::array<std::array<char, 2>, 256> kByteDigits = [] {
-  std::array<std::array<char, 2>, 256> table{};
-  for (unsigned b = 0; b < 256; ++b) {
-    table[b][0] = detail::kHexDigits[b >> 4];
-    table[b][1] = detail::kHexDigits[b & 0x0F];
-  }
-  return table;
-}();
 
 unsigned bitValue(char c) {
   if (c == '0') return 0;
@@ -60,10 +31,8 @@ unsigned bitsValue(const char* bits, size_t count) {
 
 // Eight bit characters as a byte, most significant first; throws on the first bad one.
 unsigned bitByte(const char* bits) {
-  if constexpr (detail::kWordBitTexts) {
-    const uint64_t word = detail::loadWord(bits);
-    if (detail::isBitWord(word)) return detail::bitWordMsbFirst(word);
-  }
+  const uint64_t word = detail::loadWord(bits);
+  if (detail::isBitWord(word)) return detail::bitWordMsbFirst(word);
   return bitsValue(bits, 8);
 }
 
@@ -112,7 +81,7 @@ std::string& Zin_NumberUtil::binStr2HexStr(const std::string& bits, std::string&
     pos = head;
   }
   for (; pos + 8 <= n; pos += 8, digits += 2)
-    std::memcpy(digits, kByteDigits[bitByte(in + pos)].data(), 2);
+    std::memcpy(digits, detail::kByteDigits[bitByte(in + pos)].data(), 2);
   if (pos < n) *digits = detail::kHexDigits[bitsValue(in + pos, 4)];
   return out;
 }
@@ -139,13 +108,13 @@ std::string& Zin_NumberUtil::hexStr2BinStr(const char* hex, uint32_t bitCount, s
   for (size_t k = 0; k < whole; ++k) {
     const auto v =
         static_cast<unsigned>(detail::kHexValues[static_cast<unsigned char>(hex[len - 1 - k])]);
-    std::memcpy(bits + bitCount - 4 * (k + 1), kDigitBits[v].data(), 4);
+    std::memcpy(bits + bitCount - 4 * (k + 1), detail::kDigitBits[v].data(), 4);
   }
   const size_t part = bitCount % 4;
   if (whole < len && part != 0) {
     const auto v =
         static_cast<unsigned>(detail::kHexValues[static_cast<unsigned char>(hex[len - 1 - whole])]);
-    std::memcpy(bits, kDigitBits[v].data() + (4 - part), part);
+    std::memcpy(bits, detail::kDigitBits[v].data() + (4 - part), part);
   }
   return out;
 }
@@ -157,9 +126,10 @@ std::string& Zin_NumberUtil::bin2ReverseBinStr(const unsigned char* data, uint32
   }
   out.resize(bitCount);
   const uint32_t whole = bitCount / 8;
-  for (uint32_t i = 0; i < whole; ++i) std::memcpy(&out[8 * i], kReverseBits[data[i]].data(), 8);
+  for (uint32_t i = 0; i < whole; ++i)
+    std::memcpy(&out[8 * i], detail::kByteBitsLsbFirst[data[i]].data(), 8);
   if (bitCount % 8 != 0)
-    std::memcpy(&out[8 * whole], kReverseBits[data[whole]].data(), bitCount % 8);
+    std::memcpy(&out[8 * whole], detail::kByteBitsLsbFirst[data[whole]].data(), bitCount % 8);
   return out;
 }
 
@@ -172,13 +142,7 @@ unsigned char* Zin_NumberUtil::reverseBinStr2Bin(const std::string& bits, unsign
   const char* in = bits.data();
   const size_t whole = n / 8;
   for (size_t i = 0; i < whole; ++i) {
-    if constexpr (detail::kWordBitTexts) {
-      out[i] = static_cast<unsigned char>(detail::onesWordLsbFirst(detail::loadWord(in + 8 * i)));
-    } else {
-      unsigned b = 0;
-      for (size_t j = 0; j < 8; ++j) b |= (in[8 * i + j] == '1' ? 1u : 0u) << j;
-      out[i] = static_cast<unsigned char>(b);
-    }
+    out[i] = static_cast<unsigned char>(detail::onesWordLsbFirst(detail::loadWord(in + 8 * i)));
   }
   if (n % 8 != 0) {
     unsigned b = 0;

@@ -11,6 +11,7 @@ endif()
 set(ENV{PKG_CONFIG_PATH} ${prefix}/${LIBDIR}/pkgconfig)
 execute_process(COMMAND ${CMAKE_COMMAND} -S ${CONSUMER_SOURCE} -B ${WORK_DIR}/build
   -DCMAKE_PREFIX_PATH=${prefix} -DCMAKE_BUILD_TYPE=Release -DEXPECTED_VERSION=${VERSION}
+  -DEXAMPLE_SOURCE=${EXAMPLE_SOURCE}
   RESULT_VARIABLE rc)
 if(rc)
   message(FATAL_ERROR "consumer configure failed: ${rc}")
@@ -19,7 +20,7 @@ execute_process(COMMAND ${CMAKE_COMMAND} --build ${WORK_DIR}/build RESULT_VARIAB
 if(rc)
   message(FATAL_ERROR "consumer build failed: ${rc}")
 endif()
-foreach(exe consumer_cmake consumer_pkgconfig)
+foreach(exe consumer_cmake consumer_pkgconfig consumer_info_example)
   execute_process(COMMAND ${WORK_DIR}/build/${exe} RESULT_VARIABLE rc)
   if(rc)
     message(FATAL_ERROR "${exe} failed: ${rc}")

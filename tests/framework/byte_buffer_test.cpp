@@ -1,13 +1,8 @@
-// Zin_ByteBuffer: storage, bit fields, and the hexadecimal conversions read back through their
-// reverse.
+// Zin_ByteBuffer: storage and bit fields (its hexadecimal texts are in format_test.cpp).
 #include <gtest/gtest.h>
 
-#include <cstring>
-#include <memory>
-#include <random>
 #include <stdexcept>
 #include <string>
-#include <vector>
 
 #include "ZinRT/Zin_ByteBuffer.h"
 
@@ -62,79 +57,4 @@ TEST(ByteBuffer, GetBitsReadsLittleEndianBitFields) {
   EXPECT_EQ(b.getBits(1000, 16), 0u);
   EXPECT_EQ(b.getBits(3, 0), 0u);
   EXPECT_THROW(b.getBits(0, 33), std::invalid_argument);
-}
-
-TEST(ByteBuffer, HexTextsHaveKnownForms) {
-  const unsigned char bytes[] = {0x02, 0x01, 0xAB};
-  const Zin_ByteBuffer b(bytes, 3);
-  Zin_ByteBuffer out = textBuffer("old");
-  b.bin2HexString(0, out);
-  EXPECT_STREQ(out.ptr(), "AB0102");
-  EXPECT_EQ(out.getSize(), 6u);
-  b.bin2HexString(1, out);
-  EXPECT_STREQ(out.ptr(), "AB01");
-  b.bin2HexString(3, out);
-  EXPECT_STREQ(out.ptr(), "");
-
-  std::unique_ptr<Zin_ByteBuffer> text(b.bin2HexString(0, 12));
-  EXPECT_STREQ(text->ptr(), "102");
-  text.reset(b.bin2HexString(0, 10));  // the spare bits of the top digit are left out
-  EXPECT_STREQ(text->ptr(), "102");
-  text.reset(b.bin2HexString(0, 9));
-  EXPECT_STREQ(text->ptr(), "102");
-  text.reset(b.bin2HexString(0, 8 * 3 + 8));  // past the end reads as zeros
-  EXPECT_STREQ(text->ptr(), "00AB0102");
-  text.reset(b.bin2HexString(0, 0));
-  EXPECT_STREQ(text->ptr(), "");
-
-  const Zin_ByteBuffer hex = textBuffer("0102");
-  std::unique_ptr<Zin_ByteBuffer> bin(hex.hex2Bin(0, 3));
-  ASSERT_EQ(bin->getSize(), 2u);
-  EXPECT_EQ((*bin)[0], 0x02);
-  EXPECT_EQ((*bin)[1], 0x01);
-  const Zin_ByteBuffer odd = textBuffer("xfA3x");
-  bin.reset(odd.hex2Bin(1, 3));
-  ASSERT_EQ(bin->getSize(), 2u);
-  EXPECT_EQ((*bin)[0], 0xA3);
-  EXPECT_EQ((*bin)[1], 0x0F);
-}
-
-TEST(ByteBuffer, Hex2BinRejectsBadDigitsAndRanges) {
-  const Zin_ByteBuffer hex = textBuffer("12G4");
-  EXPECT_THROW(delete hex.hex2Bin(0, 3), std::invalid_argument);
-  EXPECT_THROW(delete hex.hex2Bin(0, 4), std::out_of_range);
-  EXPECT_THROW(delete hex.hex2Bin(2, 1), std::out_of_range);
-  std::unique_ptr<Zin_ByteBuffer> ok(hex.hex2Bin(0, 1));
-  EXPECT_EQ((*ok)[0], 0x12);
-}
-
-TEST(ByteBuffer, HexConversionsRoundTripForRandomLengths) {
-  std::mt19937 rng(2024);
-  for (int round = 0; round < 200; ++round) {
-    const uint32_t size = rng() % 70;
-    std::vector<unsigned char> bytes(size);
-    for (auto& b : bytes) b = static_cast<unsigned char>(rng());
-    const Zin_ByteBuffer data(bytes.data(), size);
-
-    Zin_ByteBuffer text;
-    data.bin2HexString(0, text);
-    ASSERT_EQ(std::strlen(text.ptr()), 2u * size);
-    if (size != 0) {
-      std::unique_ptr<Zin_ByteBuffer> back(text.hex2Bin(0, text.getSize() - 1));
-      ASSERT_EQ(back->getSize(), size);
-      ASSERT_EQ(std::memcmp(back->uPtr(), bytes.data(), size), 0);
-    }
-
-    // Any bit count, also not a multiple of 4 or 8: the text holds exactly those bits.
-    const uint32_t bitCount = rng() % (8 * size + 9);
-    std::unique_ptr<Zin_ByteBuffer> bitsText(data.bin2HexString(0, bitCount));
-    const uint32_t digits = (bitCount + 3) / 4;
-    ASSERT_EQ(std::strlen(bitsText->ptr()), digits);
-    if (digits == 0) continue;
-    std::unique_ptr<Zin_ByteBuffer> bits(bitsText->hex2Bin(0, digits - 1));
-    for (uint32_t i = 0; i < 8 * bits->getSize(); ++i) {
-      const uint32_t expected = i < bitCount ? data.getBits(i, 1) : 0u;
-      ASSERT_EQ(bits->getBits(i, 1), expected) << "bit " << i << " of " << bitCount;
-    }
-  }
 }

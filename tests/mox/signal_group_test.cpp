@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "ZinMOX/ZinMOX_Command.h"
+#include "internal/ZinMOX_Command.h"
 #include "ZinMOX/ZinMOX_Signal.h"
 #include "ZinMOX/ZinMOX_SignalGroup.h"
 #include "ZinRT/Zin_SignalBase.h"

@@ -1,12 +1,13 @@
 // The port image of a MOX core: sizing, staging resets, command text and the two transfers.
-#include "ZinMOX/ZinMOX_Command.h"
+#include "internal/ZinMOX_Command.h"
 
 #include <algorithm>
 #include <array>
 #include <cstring>
 #include <memory>
+#include <stdexcept>
 
-#include "command/ZinMOX_HexTextWriter.h"
+#include "format/ZinMOX_BitFormat.h"
 #include "framework/ZinMOX_Framework.h"
 
 namespace ZinRT {
@@ -46,29 +47,6 @@ void appendLine(std::string& text, const ZIN_CORE_REF& ref, uint32_t code, char 
   text += Zin_NumberUtil::uInt2HexStr(bitLength, 32, scratch);
   text += ' ';
   text += data;
-}
-
-// Character k of entry b is bit 7-k of byte b: a byte written as a number in base 2.
-constexpr std::array<std::array<char, 8>, 256> BYTE_BITS_MSB_FIRST = [] {
-  std::array<std::array<char, 8>, 256> table{};
-  for (unsigned b = 0; b < 256; ++b) {
-    for (unsigned k = 0; k < 8; ++k) table[b][k] = ((b >> (7 - k)) & 1u) != 0 ? '1' : '0';
-  }
-  return table;
-}();
-
-// The bit text B of the read data's n least significant bits, the number that the data spell
-// read most significant bit first: character j is bit n-1-j (bit i being bit i mod 8 of byte
-// i/8). Made straight from the bytes, without a round trip through hexadecimal digits.
-void readBitText(const unsigned char* data, uint32_t n, std::string& bits) {
-  bits.resize(n);
-  char* out = bits.data();
-  const uint32_t whole = n / 8;
-  const uint32_t rest = n % 8;
-  for (uint32_t q = 0; q < whole; ++q) {
-    std::memcpy(out + (n - 8 - 8 * q), BYTE_BITS_MSB_FIRST[data[q]].data(), 8);
-  }
-  if (rest != 0) std::memcpy(out, BYTE_BITS_MSB_FIRST[data[whole]].data() + (8 - rest), rest);
 }
 
 }  // namespace
@@ -115,8 +93,11 @@ std::string& ZinMOX_Command::buildCommandText(const ZIN_CORE_REF& coreRef, uint3
       if (dataBits == 0) {
         text += '0';
       } else if (!appendDataHex(text, dataBits)) {
+        // Every writer stages only '0'/'1' and whole step strings: a text that fails its own
+        // check is a fault of the library, and no wrong data may reach the wire.
         text.resize(dataStart);
-        text += Zin_NumberUtil::binStr2HexStr(outputDataBits(), scratch);
+        throw std::logic_error("ZinMOX_Command::buildCommandText(): the port image does not give " +
+                               std::to_string(dataBits) + " bits of output data");
       }
       break;
     }
@@ -139,17 +120,7 @@ std::string& ZinMOX_Command::buildCommandText(const ZIN_CORE_REF& coreRef, uint3
   return text;
 }
 
-std::string ZinMOX_Command::outputDataBits() const {
-  std::string data;
-  data += asyncOutValueBits;
-  for (const std::string& steps : syncOutPulseTrains) data += steps;
-  data += asyncOutUpdateBits;
-  data += syncOutUpdateBits;
-  return data;
-}
-
 bool ZinMOX_Command::appendDataHex(std::string& text, size_t dataBits) const {
-  if (!mox::kWordBitTexts) return false;
   mox::HexTextWriter writer(text, dataBits);
   if (!writer.add(asyncOutValueBits)) return false;
   for (const std::string& steps : syncOutPulseTrains) {
@@ -181,7 +152,7 @@ void ZinMOX_Command::readInputs(uint32_t handle, const ZIN_CORE_REF& coreRef) {
 
   const uint32_t inputBits = ASYNC_IN_BITS * aIn + SYNC_IN_BITS * sIn;
   std::string bits;
-  readBitText(readData.uPtr(), inputBits, bits);
+  mox::msbFirstBitText(readData.uPtr(), inputBits, bits);
   const uint32_t asyncBits = inputBits - SYNC_IN_BITS * sIn;
   if (sIn != 0) unpackSyncInputs(bits.c_str() + asyncBits);
   if (aIn != 0) unpackAsyncInputs(bits.c_str());

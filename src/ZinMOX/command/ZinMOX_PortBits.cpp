@@ -6,8 +6,8 @@
 #include <string>
 #include <utility>
 
-#include "ZinMOX/ZinMOX_Core.h"
 #include "framework/ZinMOX_Framework.h"
+#include "internal/ZinMOX_CoreParts.h"
 
 namespace ZinRT {
 
@@ -38,21 +38,21 @@ void ZinMOX_Core::setPortBits(uint32_t handle, ZIN_CORE_REF coreRef, const uint8
                  "asyncOutDataBitCount");
   checkPortCount(syncOutDataBitCount, moxCoreInfo.sync_output_count, "setPortBits",
                  "syncOutDataBitCount");
-  command.clearUpdateMasks();
+  parts->command.clearUpdateMasks();
   // Each converted string is moved into the image (the image's old string goes), not copied.
   std::string bits;
   if (asyncOutDataBitCount != 0) {
-    command.setAsyncOutValueBits(
+    parts->command.setAsyncOutValueBits(
         std::move(Zin_NumberUtil::bin2ReverseBinStr(asyncOutData, asyncOutDataBitCount, bits)));
-    command.setAsyncOutUpdateBits(std::move(
+    parts->command.setAsyncOutUpdateBits(std::move(
         Zin_NumberUtil::bin2ReverseBinStr(asyncOutUpdateMask, asyncOutDataBitCount, bits)));
   }
   if (syncOutDataBitCount != 0) {
-    command.setSyncOutUpdateBits(
+    parts->command.setSyncOutUpdateBits(
         std::move(Zin_NumberUtil::bin2ReverseBinStr(syncOutUpdateMask, syncOutDataBitCount, bits)));
-    command.setStepVectors(syncOutData, syncOutDataBitCount);
+    parts->command.setStepVectors(syncOutData, syncOutDataBitCount);
   }
-  command.writeOutputs(handle, coreRef);
+  parts->command.writeOutputs(handle, coreRef);
 }
 
 void ZinMOX_Core::getPortBits(uint32_t handle, ZIN_CORE_REF coreRef, uint8_t* asyncInData,
@@ -65,18 +65,18 @@ void ZinMOX_Core::getPortBits(uint32_t handle, ZIN_CORE_REF coreRef, uint8_t* as
                  "asyncInDataBitCount");
   checkPortCount(syncInDataBitCount, moxCoreInfo.sync_input_count, "getPortBits",
                  "syncInDataBitCount");
-  command.readInputs(handle, coreRef);
+  parts->command.readInputs(handle, coreRef);
   if (asyncInDataBitCount != 0) {
-    packInto(asyncInData, command.getAsyncInValueBits());
-    packInto(asyncInActivityUp, command.getAsyncInActivityUpBits());
-    packInto(asyncInActivityDown, command.getAsyncInActivityDownBits());
+    packInto(asyncInData, parts->command.getAsyncInValueBits());
+    packInto(asyncInActivityUp, parts->command.getAsyncInActivityUpBits());
+    packInto(asyncInActivityDown, parts->command.getAsyncInActivityDownBits());
   }
   if (syncInDataBitCount != 0) {
-    packInto(syncInData, command.getSyncInValueBits());
-    packInto(syncInActivityUp, command.getSyncInActivityUpBits());
-    packInto(syncInActivityDown, command.getSyncInActivityDownBits());
-    packInto(syncInSyncActivityUp, command.getSyncInSyncActivityUpBits());
-    packInto(syncInSyncActivityDown, command.getSyncInSyncActivityDownBits());
+    packInto(syncInData, parts->command.getSyncInValueBits());
+    packInto(syncInActivityUp, parts->command.getSyncInActivityUpBits());
+    packInto(syncInActivityDown, parts->command.getSyncInActivityDownBits());
+    packInto(syncInSyncActivityUp, parts->command.getSyncInSyncActivityUpBits());
+    packInto(syncInSyncActivityDown, parts->command.getSyncInSyncActivityDownBits());
   }
 }
 

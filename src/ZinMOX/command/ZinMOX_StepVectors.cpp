@@ -7,8 +7,9 @@
 #include <emmintrin.h>
 #endif
 
-#include "ZinMOX/ZinMOX_Command.h"
+#include "format/ZinMOX_BitFormat.h"
 #include "framework/ZinMOX_Framework.h"
+#include "internal/ZinMOX_Command.h"
 
 namespace ZinRT {
 
@@ -40,15 +41,6 @@ void transposeColumn(uint64_t early, uint64_t late, ColumnSteps& out) {
   }
 }
 #else
-// Character i of entry b is bit i of byte b.
-constexpr std::array<std::array<char, 8>, 256> BIT_CHARS = [] {
-  std::array<std::array<char, 8>, 256> table{};
-  for (unsigned b = 0; b < 256; ++b) {
-    for (unsigned i = 0; i < 8; ++i) table[b][i] = ((b >> i) & 1u) != 0 ? '1' : '0';
-  }
-  return table;
-}();
-
 // Bit b of each of the eight bytes of `word` (byte t holds step t) as one byte, bit t for step t.
 inline unsigned stepBits(uint64_t word, uint32_t b) {
   return static_cast<unsigned>((((word >> b) & 0x0101010101010101ull) * 0x0102040810204080ull) >>
@@ -56,8 +48,8 @@ inline unsigned stepBits(uint64_t word, uint32_t b) {
 }
 void transposeColumn(uint64_t early, uint64_t late, ColumnSteps& out) {
   for (uint32_t b = 0; b < 8; ++b) {
-    std::memcpy(out.steps[b], BIT_CHARS[stepBits(early, b)].data(), 8);
-    std::memcpy(out.steps[b] + 8, BIT_CHARS[stepBits(late, b)].data(), 8);
+    std::memcpy(out.steps[b], mox::kByteBitsLsbFirst[stepBits(early, b)].data(), 8);
+    std::memcpy(out.steps[b] + 8, mox::kByteBitsLsbFirst[stepBits(late, b)].data(), 8);
   }
 }
 #endif

@@ -1,5 +1,5 @@
 // ZinMOX_Core: construction, initialisation from the status word, and destruction.
-#include "ZinMOX/ZinMOX_Core.h"
+#include "internal/ZinMOX_CoreParts.h"
 
 #include "ZinMOX/ZinMOX_SignalGroup.h"
 #include "framework/ZinMOX_Framework.h"
@@ -8,13 +8,15 @@ namespace ZinRT {
 
 ZinMOX_Core::ZinMOX_Core(uint32_t handle, ZIN_CORE_REF coreRef, ZIN_CORE_INFO coreInfo,
                          const unsigned char* status, uint32_t statusBitCount)
-    : Zin_SignalCore(handle, coreRef, coreInfo, status, statusBitCount), moxCoreInfo{} {}
+    : Zin_SignalCore(handle, coreRef, coreInfo, status, statusBitCount),
+      moxCoreInfo{},
+      parts(std::make_unique<Parts>()) {}
 
 ZinMOX_Core::~ZinMOX_Core() {
-  for (auto& entry : inputSignals) delete entry.second;
-  inputSignals.clear();
-  for (auto& entry : outputSignals) delete entry.second;
-  outputSignals.clear();
+  for (auto& entry : parts->inputSignals) delete entry.second;
+  parts->inputSignals.clear();
+  for (auto& entry : parts->outputSignals) delete entry.second;
+  parts->outputSignals.clear();
 }
 
 bool ZinMOX_Core::initFromStatusWord(uint32_t handle) {
@@ -22,7 +24,7 @@ bool ZinMOX_Core::initFromStatusWord(uint32_t handle) {
   const uint32_t bitCount = status.getSize() * 8;
   getMoxCoreStatus(handle, getCoreRef(), getCoreInfo(), status, bitCount, &moxCoreInfo);
   setCorePhysicalSignalCounts();
-  command.initFromCoreInfo(moxCoreInfo);
+  parts->command.initFromCoreInfo(moxCoreInfo);
   addReservedSignals();
   return true;
 }

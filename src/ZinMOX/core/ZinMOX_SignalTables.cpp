@@ -3,9 +3,9 @@
 #include <numeric>
 #include <stdexcept>
 
-#include "ZinMOX/ZinMOX_Core.h"
 #include "ZinMOX/ZinMOX_SignalGroup.h"
 #include "framework/ZinMOX_Framework.h"
+#include "internal/ZinMOX_CoreParts.h"
 
 namespace ZinRT {
 
@@ -69,21 +69,21 @@ void ZinMOX_Core::defineSignal(const std::string& name, uint32_t signalType,
           "signal type.");
     }
   }
-  ZinMOX_SignalTable& table = port.isInput ? inputSignals : outputSignals;
+  ZinMOX_SignalTable& table = port.isInput ? parts->inputSignals : parts->outputSignals;
   if (lookUp(table, name) != nullptr) {
     throw std::logic_error("The name, " + name +
                            ", is already used by another signal and will not be re-defined. "
                            "Note: Signal names are case-insensitive");
   }
   auto group =
-      std::make_unique<ZinMOX_SignalGroup>(&command, port.groupType, bitIndexes, name, name);
+      std::make_unique<ZinMOX_SignalGroup>(&parts->command, port.groupType, bitIndexes, name, name);
   table.emplace(group->getKeyName(), group.get());
   group.release();
 }
 
 void ZinMOX_Core::undefineSignal(const std::string& name, uint32_t signalType) {
   if (name.empty()) throw std::logic_error("Invalid signal name.");
-  ZinMOX_SignalTable& table = isInputCode(signalType) ? inputSignals : outputSignals;
+  ZinMOX_SignalTable& table = isInputCode(signalType) ? parts->inputSignals : parts->outputSignals;
   auto found = table.find(name);
   if (found == table.end()) {
     throw std::logic_error("The name, " + name +
@@ -95,11 +95,11 @@ void ZinMOX_Core::undefineSignal(const std::string& name, uint32_t signalType) {
 }
 
 ZinMOX_SignalGroup* ZinMOX_Core::getInputSignal(const std::string& name) {
-  return lookUp(inputSignals, name);
+  return lookUp(parts->inputSignals, name);
 }
 
 ZinMOX_SignalGroup* ZinMOX_Core::getOutputSignal(const std::string& name) {
-  return lookUp(outputSignals, name);
+  return lookUp(parts->outputSignals, name);
 }
 
 ZinMOX_SignalGroup* ZinMOX_Core::requireOutputSignal(const std::string& name) {

@@ -3,7 +3,7 @@
 
 #include <stdexcept>
 
-#include "ZinMOX/ZinMOX_Command.h"
+#include "internal/ZinMOX_Command.h"
 #include "framework/ZinMOX_Framework.h"
 
 namespace ZinRT {

@@ -5,6 +5,8 @@
 #include <stdexcept>
 #include <string>
 
+#include "format/ZinMOX_BitFormat.h"
+
 namespace ZinRT::mox {
 
 namespace {
@@ -20,7 +22,7 @@ uint32_t parseHexString(const char* text) {
   if (digit[0] == '0' && (digit[1] == 'x' || digit[1] == 'X')) digit += 2;
   uint32_t value = 0;
   for (; *digit != '\0'; ++digit) {
-    const int digitValue = Zin_NumberUtil::hexDigitValue(*digit);
+    const int digitValue = hexDigitValue(*digit);
     if (digitValue < 0) failInvalid(text);
     value = (value << 4) | static_cast<uint32_t>(digitValue);
   }
@@ -46,7 +48,7 @@ std::unique_ptr<Zin_ByteBuffer> fitHexString(const char* text, int32_t bitWidth)
   }
   out[digits] = '\0';
   for (size_t i = 0; i < digits; ++i) {
-    if (Zin_NumberUtil::hexDigitValue(out[i]) < 0) failInvalid(text);
+    if (hexDigitValue(out[i]) < 0) failInvalid(text);
   }
   return fitted;
 }

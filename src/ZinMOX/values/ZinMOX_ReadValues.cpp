@@ -3,9 +3,9 @@
 #include <stdexcept>
 #include <string>
 
-#include "ZinMOX/ZinMOX_Core.h"
 #include "ZinMOX/ZinMOX_SignalGroup.h"
 #include "framework/ZinMOX_Framework.h"
+#include "internal/ZinMOX_CoreParts.h"
 
 namespace ZinRT {
 
@@ -63,9 +63,9 @@ void ZinMOX_Core::readValues(uint32_t handle, ZIN_CORE_REF coreRef, ZinMOX_Value
   if (inputHashMap == nullptr) {
     throw std::logic_error("ZinMOX_Core::readValues() arg. failed:inputHashMap!=0");
   }
-  command.readInputs(handle, coreRef);
+  parts->command.readInputs(handle, coreRef);
   std::string key;  // the suffixed keys are built in one string
-  for (const auto& entry : inputSignals) reportSignal(*entry.second, *inputHashMap, key);
+  for (const auto& entry : parts->inputSignals) reportSignal(*entry.second, *inputHashMap, key);
 }
 
 void ZinMOX_Core::readValues(uint32_t handle, ZIN_CORE_REF coreRef,
@@ -102,7 +102,7 @@ void ZinMOX_Core::readValues(uint32_t handle, ZIN_CORE_REF coreRef,
                   valueSizes[i]};
   }
   for (uint32_t sample = 0; sample < sampleCount; ++sample) {
-    command.readInputs(handle, coreRef);
+    parts->command.readInputs(handle, coreRef);
     for (uint32_t i = 0; i < signalCount; ++i) {
       Cursor& cursor = cursors[i];
       groups[i]->getValues(cursor.buffers[0], cursor.buffers[1], cursor.buffers[2],

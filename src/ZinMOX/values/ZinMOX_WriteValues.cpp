@@ -5,9 +5,9 @@
 #include <string>
 #include <string_view>
 
-#include "ZinMOX/ZinMOX_Core.h"
 #include "ZinMOX/ZinMOX_SignalGroup.h"
 #include "framework/ZinMOX_Framework.h"
+#include "internal/ZinMOX_CoreParts.h"
 #include "values/ZinMOX_HexText.h"
 
 namespace ZinRT {
@@ -61,12 +61,12 @@ void ZinMOX_Core::writeValues(uint32_t handle, ZIN_CORE_REF coreRef,
                              parsed.name);
     }
   }
-  command.clearUpdateMasks();
+  parts->command.clearUpdateMasks();
   for (const auto& [key, text] : *outputHashMap) {
     const ValueKey parsed = splitKey(key);
     stageText(*requireOutputSignal(parsed.name), text, parsed.pulseTrain);
   }
-  command.writeOutputs(handle, coreRef);
+  parts->command.writeOutputs(handle, coreRef);
 }
 
 void ZinMOX_Core::writeValues(uint32_t handle, ZIN_CORE_REF coreRef,
@@ -106,7 +106,7 @@ void ZinMOX_Core::writeValues(uint32_t handle, ZIN_CORE_REF coreRef,
   std::vector<const uint8_t*> cursors(values, values + signalCount);
   std::vector<uint32_t> bytesLeft(valueSizes, valueSizes + signalCount);
   for (uint32_t valuesLeft = valueCount; valuesLeft > 0;) {
-    command.clearUpdateMasks();
+    parts->command.clearUpdateMasks();
     const uint32_t steps = burst ? std::min(valuesLeft, BURST_STEPS) : 1;
     for (uint32_t i = 0; i < signalCount; ++i) {
       groups[i]->setValues(cursors[i], bytesLeft[i], steps);
@@ -114,7 +114,7 @@ void ZinMOX_Core::writeValues(uint32_t handle, ZIN_CORE_REF coreRef,
       cursors[i] += advance;
       if (bytesLeft[i] >= advance) bytesLeft[i] -= advance;
     }
-    command.writeOutputs(handle, coreRef);
+    parts->command.writeOutputs(handle, coreRef);
     valuesLeft -= steps;
   }
 }

@@ -1,5 +1,5 @@
 // Checked decoding of one hexadecimal digit.
-#include "Zin_HexDigits.h"
+#include "Zin_Format.h"
 
 #include <stdexcept>
 #include <string>

@@ -15,9 +15,8 @@ namespace ZinRT {
 
 /// The image of a core's four ports as '0'/'1' strings (character i is port bit i), and the only
 /// place where command text is built and sent. Writers call clearUpdateMasks, stage characters,
-/// then writeOutputs; readers call readInputs, then read characters. Owned by value by its core;
-/// used under the session's target lock, one thread at a time. Not exported: hosts see it only
-/// as a type.
+/// then writeOutputs; readers call readInputs, then read characters. Owned by its core (in its
+/// private parts); used under the session's target lock, one thread at a time. Internal.
 class ZinMOX_Command {
  public:
   static constexpr uint32_t STEP_COUNT = 16;
@@ -32,7 +31,9 @@ class ZinMOX_Command {
   /// Reads the whole input image (codes 03 and 04); nothing when the core has no input bits.
   void readInputs(uint32_t handle, const ZIN_CORE_REF& coreRef);
   /// Renders the text of command code 1 to 4 into `text` and returns it; other codes give the
-  /// empty text. `readBitCount`, if given, receives the bits that the text reads back.
+  /// empty text. Throws std::logic_error when the port image cannot give the output data (a
+  /// fault of the library: only '0'/'1' and 16-step strings are ever staged). `readBitCount`, if
+  /// given, receives the bits that the text reads back.
   std::string& buildCommandText(const ZIN_CORE_REF& coreRef, uint32_t code, std::string& text,
                                 uint32_t* readBitCount) const;
   /// Copies value and activity characters of the input bits out of the read bit text.
@@ -100,10 +101,9 @@ class ZinMOX_Command {
   const ZINMOX_CORE_INFO& getMoxCoreInfo() const { return moxCoreInfo; }
 
  private:
-  // D, the output data bits of the write line, concatenated.
-  std::string outputDataBits() const;
-  // Appends the hexadecimal text of D (`dataBits` characters) without building D; false when the
-  // image holds anything but '0'/'1' or irregular step strings (the caller converts D then).
+  // Appends the hexadecimal text of D, the output data bits of the write line (`dataBits` of
+  // them), without building D; false when the image holds anything but '0'/'1' or irregular
+  // step strings.
   bool appendDataHex(std::string& text, size_t dataBits) const;
 
   std::string asyncOutValueBits;

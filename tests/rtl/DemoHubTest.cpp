@@ -1,0 +1,226 @@
+// The demo design at its pins: TAP, discovery, status records, write/commit/read round trips at
+// several clock ratios, broken and cut-short scans, busy, and resets in the middle of a scan.
+#include <gtest/gtest.h>
+
+#include <random>
+#include <string>
+
+#include "HubClient.h"
+#include "Vzinmox_demo_top.h"
+#include "ZinTarget/StatusWord.h"
+
+namespace RtlTest {
+namespace {
+
+using Bench = PinBench<Vzinmox_demo_top>;
+using Client = HubClient<Bench>;
+
+constexpr uint32_t kUser1 = 0x8, kUser2 = 0x9, kBypass = 0xF;
+
+struct DemoCore {
+  uint32_t major, minor, revision, ao, so, ai, si, qxMajor, qxMinor;
+};
+const DemoCore kCores[] = {
+    {10, 2, 1, 16, 8, 16, 12, 1, 4}, {6, 5, 3, 8, 4, 8, 4, 0, 0}, {5, 1, 0, 4, 2, 4, 2, 0, 0}};
+
+Image fullImage(const DemoCore& c, std::mt19937& rng) {
+  Image im;
+  for (uint32_t i = 0; i < c.ao; ++i) {
+    im.asyncValue.push_back(rng() & 1u);
+    im.asyncMark.push_back(true);
+  }
+  for (uint32_t j = 0; j < c.so; ++j) {
+    im.trains.push_back(static_cast<uint16_t>(rng()));
+    im.syncMark.push_back(true);
+  }
+  return im;
+}
+
+class DemoHub : public ::testing::Test {
+ protected:
+  explicit DemoHub(ClockPlan plan = {}) : bench_(plan), hub_(bench_, waitBits(plan)) {
+    bench_.resetTap();
+    bench_.ir(kUser1);
+  }
+  // Stages and commits a random image on a core, lets the trains settle and checks what the
+  // loopback inputs read back.
+  void roundTrip(uint32_t core, std::mt19937& rng) {
+    const DemoCore& c = kCores[core];
+    const Image im = fullImage(c, rng);
+    hub_.stage(core, im);
+    ASSERT_EQ(hub_.result(kCommit, core), 1);
+    bench_.runClocks(24);
+    const auto in = hub_.capture(core, c.ai, c.si);
+    for (uint32_t i = 0; i < c.ao; ++i) {
+      if (core == 2 && i == 3) continue;  // the square wave
+      EXPECT_EQ(in[i].value, im.asyncValue[i]) << "core " << core << " async " << i;
+    }
+    for (uint32_t j = 0; j < c.so; ++j) {
+      EXPECT_EQ(in[c.ai + j].value, (im.trains[j] >> 15) & 1u) << "core " << core << " sync " << j;
+    }
+    ASSERT_EQ(hub_.result(kClear, core), 1);
+    const auto cleared = hub_.capture(core, c.ai, c.si);
+    EXPECT_FALSE(cleared[0].up || cleared[0].down);
+    if (core == 0) {
+      EXPECT_TRUE(cleared[c.ai + 8].up && cleared[c.ai + 8].syncDown);  // the counter
+    }
+    if (core == 2) {
+      EXPECT_TRUE(cleared[3].up || cleared[3].down);  // the square wave
+    }
+  }
+
+  Bench bench_;
+  Client hub_;
+};
+
+TEST_F(DemoHub, DiscoveryAndStatusRecords) {
+  bench_.resetTap();
+  EXPECT_EQ(number(bench_.dr(Bits(32, 0)), 0, 32), 0x1A5E0A5Bu);  // IDCODE after reset
+  bench_.ir(kUser1);
+  const Bits info = hub_.record(kHubInfo, 0, 32);
+  EXPECT_EQ(hub_.lastCaptureWord().pattern, 0x5Au);
+  EXPECT_EQ(hub_.lastCaptureWord().version, 1u);
+  EXPECT_EQ(number(info, 0, 8), 1u);
+  EXPECT_EQ(number(info, 8, 5), 4u);
+
+  for (uint32_t k = 0; k < 3; ++k) {
+    const DemoCore& c = kCores[k];
+    const Bits rec = hub_.record(kStatus, k, 128);
+    EXPECT_EQ(number(rec, 0, 40), 165u | 9u << 8 | uint64_t{c.major} << 16 |
+                                      uint64_t{c.minor} << 24 | uint64_t{c.revision} << 32);
+    ZinTarget::MoxStatus s;
+    s.majorVersion = c.major;
+    s.minorVersion = c.minor;
+    s.asyncOutputCount = c.ao;
+    s.syncOutputCount = c.so;
+    s.asyncInputCount = c.ai;
+    s.syncInputCount = c.si;
+    s.qxMajorVersion = c.qxMajor;
+    s.qxMinorVersion = c.qxMinor;
+    const auto word = ZinTarget::buildMoxStatusWord(s);
+    for (size_t b = 40; b < 128; ++b) {
+      EXPECT_EQ(rec[b], (word[b / 8] >> (b % 8)) & 1u) << "core " << k << " status bit " << b;
+    }
+  }
+  const Bits other = hub_.record(kStatus, 3, 128);
+  EXPECT_EQ(number(other, 0, 40), 165u | 3u << 8 | 2u << 16 | 1u << 24);
+  EXPECT_EQ(number(other, 40, 64), 0x00C0FFEEu);
+  EXPECT_EQ(number(hub_.record(kStatus, 9, 128), 0, 64), 0u);  // no core: zeros, valid CRC
+
+  // A header without the key does nothing and shifts zeros.
+  Bits keyless = Client::header(kHubInfo, 0, 0x5A);
+  keyless.resize(80, 0);
+  const Bits out = bench_.dr(keyless);
+  EXPECT_EQ(number(out, 16, 64), 0u);
+  // A chain without a hub, and BYPASS, never show the capture pattern.
+  for (uint32_t ir : {kUser2, kBypass}) {
+    bench_.ir(ir);
+    hub_.scan(kHubInfo, 0, Bits(48, 1));
+    EXPECT_NE(hub_.lastCaptureWord().pattern, 0x5Au) << "IR " << ir;
+  }
+}
+
+TEST_F(DemoHub, BrokenStageIsRefusedAndBusyStopsCommands) {
+  std::mt19937 rng(7);
+  const Image good = fullImage(kCores[1], rng);
+  hub_.stage(1, good);
+  EXPECT_EQ(hub_.result(kCommit, 1), 1);
+  EXPECT_FALSE(hub_.lastCaptureWord().stageBad);
+
+  // One flipped bit: the CRC fails, the next scan reports it and a commit refuses.
+  Bits payload = stageNumber(fullImage(kCores[1], rng));
+  appendCrc(payload, crc16(payload, 0, payload.size()));
+  payload[5] ^= 1;
+  hub_.scan(kStage, 1, payload);
+  EXPECT_EQ(hub_.result(kCommit, 1), 2);
+  EXPECT_TRUE(hub_.lastCaptureWord().stageBad);
+  // A stage one bit too long fails too.
+  payload[5] ^= 1;
+  payload.push_back(0);
+  hub_.scan(kStage, 1, payload);
+  EXPECT_EQ(hub_.result(kCommit, 1), 2);
+  // Commands to the status-only core are no operations: no start bit.
+  EXPECT_EQ(hub_.result(kClear, 3), -1);
+
+  // Good image again; outputs still hold the first commit's values.
+  hub_.stage(1, good);
+  bench_.runClocks(24);
+  const auto in = hub_.capture(1, 8, 4);
+  for (int i = 0; i < 8; ++i) EXPECT_EQ(in[i].value, good.asyncValue[i]);
+}
+
+TEST_F(DemoHub, ResetInTheMiddleOfAScan) {
+  std::mt19937 rng(11);
+  const Image first = fullImage(kCores[1], rng);
+  hub_.stage(1, first);
+  ASSERT_EQ(hub_.result(kCommit, 1), 1);
+
+  // TRST in the middle of a stage scan: the image is invalid, a commit refuses.
+  Bits payload = stageNumber(fullImage(kCores[1], rng));
+  appendCrc(payload, crc16(payload, 0, payload.size()));
+  hub_.scan(kStage, 1, payload, 40);
+  bench_.pulseTrst();
+  bench_.ir(kUser1);
+  EXPECT_EQ(hub_.result(kCommit, 1), 2);
+  EXPECT_FALSE(hub_.lastCaptureWord().busy);
+
+  // TRST in the middle of a capture scan, right after the header: later scans work.
+  hub_.scan(kCapture, 1, Bits(200, 0), 17);
+  bench_.pulseTrst();
+  bench_.ir(kUser1);
+  bench_.runClocks(8);
+  const auto in = hub_.capture(1, 8, 4);
+  EXPECT_FALSE(hub_.lastCaptureWord().busy);
+  for (int i = 0; i < 8; ++i) EXPECT_EQ(in[i].value, first.asyncValue[i]);
+
+  // TMS reset (five ones) cuts a stage scan short through Update-DR.
+  hub_.scan(kStage, 1, payload, 60);
+  bench_.resetTap();
+  bench_.ir(kUser1);
+  EXPECT_EQ(hub_.result(kCommit, 1), 2);
+  hub_.stage(1, first);
+  EXPECT_EQ(hub_.result(kCommit, 1), 1);
+}
+
+// TCK faster than, slower than and unrelated to the design clock.
+class DemoHubRatio : public DemoHub, public ::testing::WithParamInterface<ClockPlan> {
+ protected:
+  DemoHubRatio() : DemoHub(GetParam()) {}
+};
+
+TEST_P(DemoHubRatio, RoundTripOnEveryCore) {
+  std::mt19937 rng(GetParam().seed);
+  for (uint32_t core = 0; core < 3; ++core) roundTrip(core, rng);
+  // Busy: a commit scan that ends before its answer leaves the request to the hub. A stage
+  // while it is pending is refused and leaves the image alone.
+  const Image im = fullImage(kCores[0], rng);
+  hub_.stage(0, im);
+  hub_.scan(kCommit, 0, Bits(1, 0));
+  hub_.stage(0, fullImage(kCores[0], rng));
+  const bool wasBusy = hub_.lastCaptureWord().busy;
+  bench_.runClocks(24);
+  bench_.idle(8);
+  EXPECT_EQ(hub_.result(kCommit, 0), 1);
+  EXPECT_FALSE(hub_.lastCaptureWord().busy);
+  bench_.runClocks(24);
+  const auto in = hub_.capture(0, 16, 12);
+  if (wasBusy) {
+    for (int i = 0; i < 16; ++i) EXPECT_EQ(in[i].value, im.asyncValue[i]) << "async " << i;
+  }
+  if (GetParam().tckPeriod < GetParam().clkPeriod) {
+    EXPECT_TRUE(wasBusy);
+  }
+}
+
+std::string ratioName(const ::testing::TestParamInfo<ClockPlan>& info) {
+  static const char* const names[] = {"TckFaster", "TckSlower", "Jitter7to3", "Jitter3to7"};
+  return names[info.index];
+}
+
+INSTANTIATE_TEST_SUITE_P(Clocks, DemoHubRatio,
+                         ::testing::Values(ClockPlan{1, 13, 0, 1}, ClockPlan{13, 1, 0, 2},
+                                           ClockPlan{7, 3, 0.3, 3}, ClockPlan{3, 7, 0.3, 4}),
+                         ratioName);
+
+}  // namespace
+}  // namespace RtlTest

@@ -1,0 +1,143 @@
+// Pin-level driver for the Verilator models of the JTAG tops: it schedules the design clock and
+// TCK on one time line (any ratio, optional jitter), walks the TAP and scans bit vectors.
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <ostream>
+#include <random>
+#include <vector>
+
+namespace RtlTest {
+
+using Bits = std::vector<uint8_t>;  // one bit per element, bit 0 shifted first
+
+// Periods in arbitrary time units; jitter is a fraction of each half period (0 to 0.9).
+struct ClockPlan {
+  double tckPeriod = 10;
+  double clkPeriod = 10;
+  double jitter = 0;
+  uint32_t seed = 1;
+};
+inline void PrintTo(const ClockPlan& p, std::ostream* os) {
+  *os << "TCK " << p.tckPeriod << ", clock " << p.clkPeriod << ", jitter " << p.jitter;
+}
+
+template <class Model>
+class PinBench {
+ public:
+  explicit PinBench(const ClockPlan& plan) : plan_(plan), rng_(plan.seed) {
+    m_.clk_i = 0;
+    m_.tck_i = 0;
+    m_.tms_i = 1;
+    m_.tdi_i = 0;
+    m_.rst_ni = 0;
+    m_.trst_ni = 0;
+    m_.eval();
+    nextClk_ = half(plan_.clkPeriod);
+    runTo(4 * plan_.clkPeriod);
+    m_.rst_ni = 1;
+    m_.trst_ni = 1;
+    m_.eval();
+  }
+  PinBench(const PinBench&) = delete;
+  PinBench& operator=(const PinBench&) = delete;
+  ~PinBench() { m_.final(); }
+
+  Model& model() { return m_; }
+  uint64_t clkEdges() const { return edges_; }
+  // Called after every rising edge of the design clock.
+  void onClockEdge(std::function<void(Model&)> observer) { observer_ = std::move(observer); }
+
+  // Lets design-clock edges happen up to time t.
+  void runTo(double t) {
+    while (nextClk_ <= t) {
+      now_ = nextClk_;
+      m_.clk_i = !m_.clk_i;
+      m_.eval();
+      if (m_.clk_i) {
+        ++edges_;
+        if (observer_) observer_(m_);
+      }
+      nextClk_ += half(plan_.clkPeriod);
+    }
+    now_ = t;
+  }
+  void runClocks(uint64_t n) { runTo(now_ + static_cast<double>(n) * plan_.clkPeriod); }
+
+  // One TCK cycle; returns TDO as sampled just before the rising edge.
+  bool tck(bool tms, bool tdi) {
+    m_.tms_i = tms;
+    m_.tdi_i = tdi;
+    m_.eval();
+    runTo(now_ + half(plan_.tckPeriod));
+    const bool tdo = m_.tdo_o;
+    m_.tck_i = 1;
+    m_.eval();
+    runTo(now_ + half(plan_.tckPeriod));
+    m_.tck_i = 0;
+    m_.eval();
+    return tdo;
+  }
+
+  void resetTap() {
+    for (int i = 0; i < 5; ++i) tck(true, false);
+    tck(false, false);
+  }
+  void pulseTrst() {
+    m_.trst_ni = 0;
+    m_.eval();
+    runTo(now_ + plan_.tckPeriod);
+    m_.trst_ni = 1;
+    m_.eval();
+    tck(false, false);  // Test-Logic-Reset -> Run-Test/Idle
+  }
+  void idle(int cycles) {
+    for (int i = 0; i < cycles; ++i) tck(false, false);
+  }
+
+  // IR scan from Run-Test/Idle back to Run-Test/Idle.
+  void ir(uint32_t value, int length = 4) {
+    tck(true, false);
+    tck(true, false);
+    tck(false, false);
+    tck(false, false);
+    for (int i = 0; i < length; ++i) tck(i == length - 1, (value >> i) & 1u);
+    tck(true, false);
+    tck(false, false);
+  }
+
+  // DR scan from Run-Test/Idle. With stopAfter set, the scan stops in Shift-DR after that many
+  // bits (for tests that cut a scan short); otherwise it returns to Run-Test/Idle.
+  Bits dr(const Bits& in, size_t stopAfter = SIZE_MAX) {
+    tck(true, false);
+    tck(false, false);
+    tck(false, false);
+    Bits out;
+    out.reserve(in.size());
+    for (size_t i = 0; i < in.size() && i < stopAfter; ++i) {
+      out.push_back(tck(i + 1 == in.size(), in[i]));
+    }
+    if (stopAfter >= in.size()) {
+      tck(true, false);
+      tck(false, false);
+    }
+    return out;
+  }
+
+ private:
+  double half(double period) {
+    std::uniform_real_distribution<double> d(-plan_.jitter, plan_.jitter);
+    return period / 2 * (1 + d(rng_));
+  }
+
+  Model m_;
+  ClockPlan plan_;
+  std::mt19937 rng_;
+  double now_ = 0;
+  double nextClk_ = 0;
+  uint64_t edges_ = 0;
+  std::function<void(Model&)> observer_;
+};
+
+}  // namespace RtlTest
