@@ -24,6 +24,12 @@ endforeach()
 foreach(target ${ZIN_LIBRARY_TARGETS})
   zin_install_rpath(${target} ${CMAKE_INSTALL_LIBDIR})
 endforeach()
+# The simulated target's and the network library's headers use std::string_view and std::optional.
+foreach(target ZinSim ZinNet)
+  if(TARGET ${target})
+    target_compile_features(${target} PUBLIC cxx_std_17)
+  endif()
+endforeach()
 
 install(TARGETS ${ZIN_FRAMEWORK_TARGETS} EXPORT ZinMOXTargets
   LIBRARY DESTINATION ${ZIN_FRAMEWORK_LIBDIR} COMPONENT framework

@@ -9,8 +9,9 @@ target_compile_options(zin_warnings INTERFACE
   $<$<CXX_COMPILER_ID:GNU>:-Wno-restrict>)
 
 # zin_add_shared_library(NAME SOURCES...): a shared library with a SOVERSION, a ZinMOX:: alias,
-# hidden visibility and the public include tree. Its public headers need C++17, which consumers
-# get through the compile feature; a sanitized build passes its runtime on to them.
+# hidden visibility and the public include tree. Consumers get the C++ standard that its public
+# headers need through a compile feature (C++11 unless raised, see cmake/ZinInstall.cmake); a
+# sanitized build passes its runtime on to them.
 function(zin_add_shared_library name)
   add_library(${name} SHARED ${ARGN})
   add_library(ZinMOX::${name} ALIAS ${name})
@@ -21,7 +22,7 @@ function(zin_add_shared_library name)
     $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include>
     $<BUILD_INTERFACE:${ZIN_GENERATED_INCLUDE_DIR}>
     $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
-  target_compile_features(${name} PUBLIC cxx_std_17)
+  target_compile_features(${name} PUBLIC cxx_std_11)
   if(ZIN_SANITIZE_LINK_FLAGS)
     target_link_options(${name} INTERFACE ${ZIN_SANITIZE_LINK_FLAGS})
   endif()

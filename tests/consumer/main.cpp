@@ -7,6 +7,7 @@
 #include "ZinMOX/ZinMOX_Version.h"
 #ifdef ZIN_CONSUMER_CLASSES
 #include "ZinMOX/ZinMOX_Core.h"
+#include "ZinSim/Description.h"
 #endif
 
 int main() {
