@@ -4,9 +4,15 @@
 #   scripts/test.sh           the plain CMake workflow in build/ (no preset, default options):
 #                             cmake -S . -B build && cmake --build build && ctest --test-dir build
 #   scripts/test.sh PRESET    the same with a preset (asan, tsan, debug, default) in build/PRESET
+#   scripts/test.sh mutate [options]   the mutation check instead (scripts/mutate.py)
 # BUILD_JOBS (default 2) sets the parallel build and test jobs.
 set -euo pipefail
 cd "$(dirname "$0")/.."
+if [[ "${1:-}" == mutate ]]; then
+  shift
+  scripts/setup.sh
+  exec scripts/mutate.py "$@"
+fi
 jobs="${BUILD_JOBS:-2}"
 scripts/setup.sh
 if [ $# -eq 0 ]; then

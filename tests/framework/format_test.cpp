@@ -135,6 +135,17 @@ TEST(Format, MalformedInputIsRejectedWithItsText) {
       << "digits above the kept bits are checked too";
   EXPECT_EQ(rejection([&] { delete textBuffer("12G4").hex2Bin(0, 3); }),
             "Zin_ByteBuffer::hex2Bin: not a hexadecimal digit (character code 71)");
+  // Sixteen digits are converted at once: a bad one among them is still reported as the
+  // conversion meets it from the last digit on, and every character is judged like the table.
+  EXPECT_EQ(
+      rejection([&] { delete textBuffer("Z0123456G89abcdef0123456789ABCDEF").hex2Bin(0, 32); }),
+      "Zin_ByteBuffer::hex2Bin: not a hexadecimal digit (character code 71)");
+  for (int c = 0; c < 256; ++c) {
+    std::string text(16, 'a');
+    text[c % 16] = static_cast<char>(c);
+    const bool digit = Zin_NumberUtil::hexDigitValue(static_cast<char>(c)) >= 0;
+    ASSERT_EQ(rejection([&] { delete textBuffer(text).hex2Bin(0, 15); }) == "accepted", digit) << c;
+  }
   EXPECT_THROW(delete textBuffer("12").hex2Bin(0, 2), std::out_of_range);
   EXPECT_THROW(delete textBuffer("12").hex2Bin(1, 0), std::out_of_range);
   EXPECT_THROW(Zin_NumberUtil::hexStr2BinStr(nullptr, 4, out), std::invalid_argument);
