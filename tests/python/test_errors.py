@@ -35,14 +35,6 @@ def test_library_checks_reach_python_with_their_text(session, core):
     with pytest.raises(zinmox.Error, match="^.pulsetrain cannot be used with the non-synchronous "
                        "output: fast$"):
         core.write(fast=[0] * 16)
-    with pytest.raises(zinmox.Error, match="is already used by another signal"):
-        core.define("fast", "async_out", 1)
-    with pytest.raises(zinmox.Error, match="^The name, slow, has not been defined"):
-        core.undefine("slow", "async_out")
-    with pytest.raises(zinmox.Error, match="arrayLen!=0"):
-        core.define("empty", "async_out", [])
-    with pytest.raises(zinmox.Error, match="index is greater than the number"):
-        core.define("far", "async_out", 16)
     core.undefine("fast", "async_out")
     with pytest.raises(zinmox.Error, match="Could not find a signal with the name: fast"):
         core.write(fast=1)

@@ -257,6 +257,25 @@ TEST_F(ModelTest, AChangeAtTheClearingEdgeStaysLatched) {
   EXPECT_EQ(bit1, "0101");  // changes at edges 2 and 4; where nothing changes the clear clears
 }
 
+TEST_F(ModelTest, AReadThatLetsNoTimePassClearsEveryLatchAsItsSequenceEnds) {
+  target->setCyclesPerSequence(0);
+  target->setInputSource(kRef, InputPort::Sync, 0, InputSource::loopback(OutputPort::Async, 0));
+  write(asyncImage("1000", "1000"));  // a rise and a fall, each sampled by a clock edge
+  target->advance(1);
+  write(asyncImage("0000", "1000"));
+  target->advance(1);
+  const ZinTest::InputImage set = read();
+  for (const std::string* latch : {&set.asyncUp, &set.asyncDown, &set.syncUp, &set.syncDown,
+                                   &set.syncSyncUp, &set.syncSyncDown}) {
+    EXPECT_EQ((*latch)[0], '1');
+  }
+  const ZinTest::InputImage cleared = read();
+  for (const std::string* latch : {&cleared.asyncUp, &cleared.asyncDown, &cleared.syncUp,
+                                   &cleared.syncDown, &cleared.syncSyncUp, &cleared.syncSyncDown}) {
+    EXPECT_EQ(latch->find('1'), std::string::npos) << *latch;
+  }
+}
+
 TEST_F(ModelTest, StatusAndCoreList) {
   ZIN_CORE_INFO info{};
   std::vector<unsigned char> status(16, 0);

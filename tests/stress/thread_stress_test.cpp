@@ -4,6 +4,7 @@
 // and a successful one none, and no thread receives a message about another thread's signals.
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <chrono>
 #include <cstdint>
 #include <memory>
@@ -29,6 +30,16 @@ thread_local std::vector<Delivered> delivered;
 
 void recordOnThisThread(void*, uint32_t handle, uint32_t code, const char* text) {
   delivered.push_back({handle, code, text != nullptr ? text : ""});
+}
+
+// A scripted target with a 16/12/16/12 MOX core at each of `refs`.
+std::shared_ptr<ZinTarget::ScriptedTransport> moxTarget(const std::vector<ZIN_CORE_REF>& refs) {
+  auto transport = std::make_shared<ZinTarget::ScriptedTransport>();
+  ZinTarget::MoxStatus status;
+  status.asyncInputCount = status.asyncOutputCount = 16;
+  status.syncInputCount = status.syncOutputCount = 12;
+  for (const ZIN_CORE_REF& ref : refs) transport->placeMoxCore(ref, status);
+  return transport;
 }
 
 // "t<id>_", the start of every signal name of one thread. (Built by appending: g++ 12 mistakes
@@ -130,16 +141,8 @@ class Worker {
 
 TEST(ThreadStress, ThreadsOnSharedAndSeparateSessionsKeepTheirMessagesApart) {
   const ZIN_CORE_REF first{1, 2, 0}, second{1, 2, 1};
-  ZinTarget::MoxStatus status;
-  status.asyncInputCount = status.asyncOutputCount = 16;
-  status.syncInputCount = status.syncOutputCount = 12;
-  auto sharedTarget = std::make_shared<ZinTarget::ScriptedTransport>();
-  auto separateTarget = std::make_shared<ZinTarget::ScriptedTransport>();
-  sharedTarget->placeMoxCore(first, status);
-  sharedTarget->placeMoxCore(second, status);
-  separateTarget->placeMoxCore(first, status);
-  const uint32_t shared = ZinJtag_openSession(sharedTarget);
-  const uint32_t separate = ZinJtag_openSession(separateTarget);
+  const uint32_t shared = ZinJtag_openSession(moxTarget({first, second}));
+  const uint32_t separate = ZinJtag_openSession(moxTarget({first}));
   const std::vector<std::pair<uint32_t, ZIN_CORE_REF>> places = {
       {shared, first},  {shared, first},   {shared, first},
       {shared, second}, {separate, first}, {separate, first}};

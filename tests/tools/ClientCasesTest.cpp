@@ -6,7 +6,6 @@
 #include <nlohmann/json.hpp>
 
 #include "ToolOutput.h"
-#include "ToolRunner.h"
 
 namespace {
 

@@ -1,7 +1,7 @@
 // Every error path: its exit status and its message, and never a crash.
 #include <gtest/gtest.h>
 
-#include "ToolRunner.h"
+#include "ToolOutput.h"
 
 namespace {
 
@@ -48,6 +48,7 @@ TEST(ErrorPaths, UsageErrorsExitWithTwoAndAHint) {
       {{"ports", "0:1:1", "write", "--sync-train", "001F"}, 2, "step 0 of --sync-train"},
       {{"ports", "0:1:3", "write", "--async", "1"}, 1, "wrong core type"},
       {{"--target", "x.json", "demo"}, 2, "leave out --target"},
+      {{"serve", "--listen", "127.0.0.1"}, 2, "missing ':PORT'"},
   };
   for (const ErrorCase& c : cases) expectError(c);
   const auto hinted = runTool({"read", "1:2"});
