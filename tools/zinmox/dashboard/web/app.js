@@ -94,6 +94,7 @@ function applyLive(live) {
     state.samples = [];
     state.lastSeq = 0;
     state.version = -1;
+    $("#inputs").replaceChildren();
   }
 }
 
@@ -117,8 +118,12 @@ async function loadCore() {
     names.append(el("tr", {}, el("td", {}, n.name), el("td", {}, n.port),
       el("td", {}, n.bits), el("td", {}, remove)));
   }
-  buildOutputs(details);
-  $("#inputs").replaceChildren();
+  // Controls are rebuilt only when the names change, so a write elsewhere does not reset them.
+  const shape = JSON.stringify([state.core, details.names]);
+  if (shape !== state.shape) {
+    state.shape = shape;
+    buildOutputs(details);
+  }
 }
 
 // ---- outputs -----------------------------------------------------------------------------
@@ -216,6 +221,8 @@ function flash(node, cls) {
 
 function showInputs(inputs) {
   const box = $("#inputs");
+  const names = new Set(inputs.map((input) => input.name));
+  for (const row of [...box.children]) if (!names.has(row.dataset.input)) row.remove();
   for (const input of inputs) {
     let row = box.querySelector(`[data-input="${CSS.escape(input.name)}"]`);
     if (!row) { row = inputRow(input); box.append(row); }
@@ -253,6 +260,7 @@ function drawWaveform() {
     ctx.strokeStyle = input.width === 1 ? "#5fd35f" : "#4dabf7";
     ctx.beginPath();
     let previous = null;
+    let textEnd = 0;  // bus values are written only where the previous one ends
     shown.forEach((sample, i) => {
       const match = sample.inputs.find((x) => x.name === input.name);
       const value = match ? match.value : "?";
@@ -264,8 +272,11 @@ function drawWaveform() {
       } else {
         if (value !== previous) {
           ctx.moveTo(x, top + 4); ctx.lineTo(x, top + 20);
-          ctx.fillStyle = "#dde";
-          ctx.fillText(value, x + 2, top + 16);
+          if (x >= textEnd) {
+            ctx.fillStyle = "#dde";
+            ctx.fillText(value, x + 2, top + 16);
+            textEnd = x + ctx.measureText(value).width + 6;
+          }
         }
         ctx.moveTo(x, top + 4); ctx.lineTo(x + dx, top + 4);
         ctx.moveTo(x, top + 20); ctx.lineTo(x + dx, top + 20);
