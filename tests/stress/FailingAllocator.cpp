@@ -15,23 +15,6 @@ std::atomic<uint64_t> failAtCount{0};
 std::atomic<bool> failed{false};
 std::atomic<int64_t> live{0};
 
-void* allocate(std::size_t size) {
-  if (armed.load(std::memory_order_relaxed)) {
-    const uint64_t n = counted.fetch_add(1) + 1;
-    if (n == failAtCount.load() && !failed.exchange(true)) throw std::bad_alloc();
-  }
-  void* p = std::malloc(size != 0 ? size : 1);
-  if (p == nullptr) throw std::bad_alloc();
-  live.fetch_add(1, std::memory_order_relaxed);
-  return p;
-}
-
-void release(void* p) {
-  if (p == nullptr) return;
-  live.fetch_sub(1, std::memory_order_relaxed);
-  std::free(p);
-}
-
 }  // namespace
 
 void armAllocationFailure(uint64_t failAt) {
@@ -41,9 +24,8 @@ void armAllocationFailure(uint64_t failAt) {
   armed = true;
 }
 
-uint64_t disarmAllocationFailure() {
+void disarmAllocationFailure() {
   armed = false;
-  return counted.load();
 }
 
 bool allocationFailureHappened() {
@@ -56,41 +38,49 @@ int64_t liveAllocations() {
 
 }  // namespace ZinStress
 
+// Every form is replaced, so that no allocation of this program comes from another allocator
+// (a sanitizer's, say) and is then freed by these.
 void* operator new(std::size_t size) {
-  return ZinStress::allocate(size);
+  using namespace ZinStress;
+  if (armed.load(std::memory_order_relaxed) && counted.fetch_add(1) + 1 == failAtCount.load() &&
+      !failed.exchange(true)) {
+    throw std::bad_alloc();
+  }
+  void* p = std::malloc(size != 0 ? size : 1);
+  if (p == nullptr) throw std::bad_alloc();
+  live.fetch_add(1, std::memory_order_relaxed);
+  return p;
 }
 void* operator new[](std::size_t size) {
-  return ZinStress::allocate(size);
+  return operator new(size);
 }
 void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
   try {
-    return ZinStress::allocate(size);
+    return operator new(size);
   } catch (...) {
     return nullptr;
   }
 }
-void* operator new[](std::size_t size, const std::nothrow_t&) noexcept {
-  try {
-    return ZinStress::allocate(size);
-  } catch (...) {
-    return nullptr;
-  }
+void* operator new[](std::size_t size, const std::nothrow_t& tag) noexcept {
+  return operator new(size, tag);
 }
 void operator delete(void* p) noexcept {
-  ZinStress::release(p);
+  if (p == nullptr) return;
+  ZinStress::live.fetch_sub(1, std::memory_order_relaxed);
+  std::free(p);
 }
 void operator delete[](void* p) noexcept {
-  ZinStress::release(p);
+  operator delete(p);
 }
 void operator delete(void* p, std::size_t) noexcept {
-  ZinStress::release(p);
+  operator delete(p);
 }
 void operator delete[](void* p, std::size_t) noexcept {
-  ZinStress::release(p);
+  operator delete(p);
 }
 void operator delete(void* p, const std::nothrow_t&) noexcept {
-  ZinStress::release(p);
+  operator delete(p);
 }
 void operator delete[](void* p, const std::nothrow_t&) noexcept {
-  ZinStress::release(p);
+  operator delete(p);
 }

@@ -8,13 +8,11 @@
 namespace ZinStress {
 
 /// From now on, count allocations; the `failAt`-th one (1-based) throws std::bad_alloc, once.
-/// failAt 0 counts without failing.
 void armAllocationFailure(uint64_t failAt);
-/// Stops counting and failing; returns how many allocations were counted since arming.
-uint64_t disarmAllocationFailure();
+void disarmAllocationFailure();
 /// Whether the armed failure has been thrown.
 bool allocationFailureHappened();
-/// Allocations made and not yet freed (through operator new and delete), for leak checks.
+/// Allocations made and not yet freed, for leak checks.
 int64_t liveAllocations();
 
 }  // namespace ZinStress

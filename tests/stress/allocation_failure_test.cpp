@@ -7,7 +7,6 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <cstdint>
 #include <cstring>
 #include <functional>
 #include <memory>
@@ -21,38 +20,31 @@
 
 namespace {
 
-using ZinStress::allocationFailureHappened;
-using ZinStress::armAllocationFailure;
-using ZinStress::disarmAllocationFailure;
-
-constexpr uint32_t kFailure = 0x80000000u;
-
 struct Message {
-  uint32_t code;
+  uint32_t code = 0;
   std::string text;
 };
 
 // Messages are kept in slots made up front, so that recording one allocates nothing (an
 // allocation failing in the test's own handler would otherwise lose the message).
 struct Recorder {
-  static constexpr size_t kSlots = 16;
-  std::vector<Message> slots;
+  std::vector<Message> slots = std::vector<Message>(16);
   size_t used = 0;
-  Recorder() : slots(kSlots) {
+  Recorder() {
     for (Message& slot : slots) slot.text.reserve(512);
   }
   static void onMessage(void* user, uint32_t, uint32_t code, const char* text) {
     auto* self = static_cast<Recorder*>(user);
-    if (self->used == kSlots) return;
+    if (self->used == self->slots.size()) return;
     Message& slot = self->slots[self->used++];
     slot.code = code;
     slot.text.assign(text, std::min<size_t>(std::strlen(text), slot.text.capacity()));
   }
-};
-
-struct Call {
-  const char* name;
-  std::function<uint32_t()> run;
+  std::vector<Message> take() {
+    std::vector<Message> taken(slots.begin(), slots.begin() + used);
+    used = 0;
+    return taken;
+  }
 };
 
 // A session with one MOX core and the calls of the sequence.
@@ -67,68 +59,48 @@ class Scenario {
     transport_->placeMoxCore(ref_, status);
     transport_->queueReadData(std::vector<unsigned char>(32, 0x5A));
     handle_ = ZinJtag_openSession(transport_);
-    ZinJtag_setMessageHandler(handle_, &Recorder::onMessage, &recorder_);
-    writeMap_ = {{"ctl", "2A5"},
-                 {"steps.pulsetrain", "0123456789ABCDEF0123456789ABCDEF"},
-                 {"async_out_data", "3FF"}};
+    ZinJtag_setMessageHandler(handle_, &Recorder::onMessage, &recorder);
   }
   ~Scenario() { ZinJtag_closeSession(handle_); }
 
-  std::vector<Call> calls() {
+  std::vector<std::pair<const char*, std::function<uint32_t()>>> calls() {
+    const uint32_t h = handle_;
+    ZIN_CORE_REF* r = &ref_;
     return {
-        {"initCore", [this] { return ZinMOX_initCore(handle_, &ref_); }},
-        {"defineSignal",
-         [this] { return ZinMOX_defineSignal(handle_, &ref_, "ctl", ZINMOX_ASYNC_OUTPUT, 3); }},
+        {"initCore", [=] { return ZinMOX_initCore(h, r); }},
+        {"defineSignal", [=] { return ZinMOX_defineSignal(h, r, "ctl", ZINMOX_ASYNC_OUTPUT, 3); }},
         {"defineBus(sync out)",
-         [this] {
-           const uint32_t bits[] = {6, 0, 2};
-           return ZinMOX_defineBus(handle_, &ref_, "steps", ZINMOX_SYNC_OUTPUT, bits, 3);
-         }},
+         [=] { return ZinMOX_defineBus(h, r, "steps", ZINMOX_SYNC_OUTPUT, stepBits, 3); }},
         {"defineBus(sync in)",
-         [this] {
-           const uint32_t bits[] = {8, 1, 4, 5};
-           return ZinMOX_defineBus(handle_, &ref_, "status_with_a_long_name", ZINMOX_SYNC_INPUT,
-                                   bits, 4);
+         [=] {
+           return ZinMOX_defineBus(h, r, "status_with_a_long_name", ZINMOX_SYNC_INPUT, inBits, 4);
          }},
         {"writeValues",
-         [this] {
-           uintptr_t word = reinterpret_cast<uintptr_t>(&writeMap_);
-           return ZinMOX_writeValues(handle_, &ref_, &word);
-         }},
+         [=, this] { return ZinMOX_writeValues(h, r, &(word_ = mapWord(writeMap_))); }},
         {"readValues",
-         [this] {
+         [=, this] {
            readMap_.clear();
-           uintptr_t word = reinterpret_cast<uintptr_t>(&readMap_);
-           return ZinMOX_readValues(handle_, &ref_, &word);
+           return ZinMOX_readValues(h, r, &(word_ = mapWord(readMap_)));
          }},
         {"setPortBits",
-         [this] {
-           return ZinMOX_setPortBits(handle_, &ref_, bytes_, bytes_ + 2, 10, bytes_ + 4, bytes_, 7);
-         }},
+         [=, this] { return ZinMOX_setPortBits(h, r, in_, in_ + 2, 10, in_ + 4, in_, 7); }},
         {"getPortBits",
-         [this] {
-           return ZinMOX_getPortBits(handle_, &ref_, out_, out_ + 2, out_ + 4, 12, out_ + 6,
-                                     out_ + 8, out_ + 10, out_ + 12, out_ + 14, 9);
+         [=, this] {
+           return ZinMOX_getPortBits(h, r, out_, out_ + 2, out_ + 4, 12, out_ + 6, out_ + 8,
+                                     out_ + 10, out_ + 12, out_ + 14, 9);
          }},
-        {"getSignalSizes",
-         [this] {
-           const char* names[] = {"ctl", "steps"};
-           uint32_t sizes[2];
-           return ZinMOX_getSignalSizes(handle_, &ref_, names, sizes, 2, 1);
-         }},
+        {"getSignalSizes", [=, this] { return ZinMOX_getSignalSizes(h, r, names_, sizes_, 2, 1); }},
         {"getCoreInfo",
-         [this] {
-           infoMap_.clear();
-           uintptr_t word = reinterpret_cast<uintptr_t>(&infoMap_);
-           return ZinMOX_getCoreInfo(handle_, &ref_, &word);
+         [=, this] {
+           readMap_.clear();
+           return ZinMOX_getCoreInfo(h, r, &(word_ = mapWord(readMap_)));
          }},
-        {"undefineName",
-         [this] { return ZinMOX_undefineName(handle_, &ref_, "ctl", ZINMOX_ASYNC_OUTPUT); }},
-        {"terminateCore", [this] { return ZinMOX_terminateCore(handle_, &ref_); }},
+        {"undefineName", [=] { return ZinMOX_undefineName(h, r, "ctl", ZINMOX_ASYNC_OUTPUT); }},
+        {"terminateCore", [=] { return ZinMOX_terminateCore(h, r); }},
     };
   }
 
-  // The core left behind (if any) still takes whole-port and named calls.
+  // The core left behind, if any, still takes whole-port and named calls.
   void checkUsable() {
     uint32_t isMox = 0;
     ASSERT_EQ(ZinMOX_isMOXCore(handle_, &ref_, &isMox), 0u);
@@ -136,28 +108,32 @@ class Scenario {
                            nullptr, nullptr, 0) != 0) {
       return;  // no core registered: the sequence's init failed or its terminate ran
     }
-    EXPECT_EQ(ZinMOX_setPortBits(handle_, &ref_, bytes_, bytes_, 10, bytes_ + 4, bytes_, 7), 0u);
+    EXPECT_EQ(ZinMOX_setPortBits(handle_, &ref_, in_, in_, 10, in_ + 4, in_, 7), 0u);
     ZinRT::ZinMOX_ValueMap map{{"sync_out_data", "55"}};
-    uintptr_t word = reinterpret_cast<uintptr_t>(&map);
-    EXPECT_EQ(ZinMOX_writeValues(handle_, &ref_, &word), 0u);
-    word = reinterpret_cast<uintptr_t>(&readMap_);
-    EXPECT_EQ(ZinMOX_readValues(handle_, &ref_, &word), 0u);
+    EXPECT_EQ(ZinMOX_writeValues(handle_, &ref_, &(word_ = mapWord(map))), 0u);
+    EXPECT_EQ(ZinMOX_readValues(handle_, &ref_, &(word_ = mapWord(readMap_))), 0u);
   }
 
-  std::vector<Message> takeMessages() {
-    std::vector<Message> taken(recorder_.slots.begin(), recorder_.slots.begin() + recorder_.used);
-    recorder_.used = 0;
-    return taken;
-  }
+  Recorder recorder;
 
  private:
+  static uintptr_t mapWord(ZinRT::ZinMOX_ValueMap& map) {
+    return reinterpret_cast<uintptr_t>(&map);
+  }
+  static constexpr uint32_t stepBits[3] = {6, 0, 2};
+  static constexpr uint32_t inBits[4] = {8, 1, 4, 5};
+
   std::shared_ptr<ZinTarget::ScriptedTransport> transport_;
   uint32_t handle_ = 0;
   ZIN_CORE_REF ref_{1, 2, 0};
-  Recorder recorder_;
-  ZinRT::ZinMOX_ValueMap writeMap_, readMap_, infoMap_;
-  uint8_t bytes_[4 + 16 * 1] = {0x5A, 0x03, 0xFF, 0x01, 1,  2,  3,  4,  5,  6,
-                                7,    8,    9,    10,   11, 12, 13, 14, 15, 16};
+  ZinRT::ZinMOX_ValueMap writeMap_{{"ctl", "2A5"},
+                                   {"steps.pulsetrain", "0123456789ABCDEF0123456789ABCDEF"},
+                                   {"async_out_data", "3FF"}};
+  ZinRT::ZinMOX_ValueMap readMap_;
+  uintptr_t word_ = 0;
+  uint32_t sizes_[2] = {};
+  const char* names_[2] = {"ctl", "steps"};
+  uint8_t in_[20] = {0x5A, 0x03, 0xFF, 0x01, 1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16};
   uint8_t out_[16] = {};
 };
 
@@ -170,65 +146,55 @@ bool isLibraryMessage(const std::string& text) {
   return false;
 }
 
-// Runs the sequence with the Nth allocation failing; returns false once N is past the number of
-// allocations the sequence makes.
+// Runs the sequence with the Nth allocation failing; false once N is past its allocations.
 bool runWithFailureAt(uint64_t n) {
   Scenario scenario;
-  std::vector<Call> calls = scenario.calls();
-  bool metFailure = false;
-  // Taken out of the message record before the sequence runs, so that it allocates nothing.
+  auto calls = scenario.calls();
+  // Made before the sequence runs, so that keeping the results allocates nothing.
   std::vector<std::vector<Message>> messagesOf(calls.size(), std::vector<Message>());
   std::vector<uint32_t> results(calls.size());
-  std::vector<int> failedIn(calls.size(), 0);
-  armAllocationFailure(n);
+  size_t failedAt = calls.size();
+  ZinStress::armAllocationFailure(n);
   for (size_t i = 0; i < calls.size(); ++i) {
-    results[i] = calls[i].run();
-    failedIn[i] = !metFailure && allocationFailureHappened();
-    metFailure = metFailure || failedIn[i];
-    messagesOf[i] = scenario.takeMessages();
+    results[i] = calls[i].second();
+    if (failedAt == calls.size() && ZinStress::allocationFailureHappened()) failedAt = i;
+    messagesOf[i] = scenario.recorder.take();
   }
-  disarmAllocationFailure();
+  ZinStress::disarmAllocationFailure();
 
-  bool before = true;
   for (size_t i = 0; i < calls.size(); ++i) {
     const std::vector<Message>& messages = messagesOf[i];
-    const uint32_t result = results[i];
-    const std::string where =
-        std::string("N=").append(std::to_string(n)) + " " + calls[i].name + ": ";
-    before = before && !failedIn[i];
-    if (before) {
-      EXPECT_EQ(result, 0u) << where << (messages.empty() ? "" : messages[0].text);
+    const std::string where = "N=" + std::to_string(n) + " " + calls[i].first + ": " +
+                              (messages.empty() ? "" : messages[0].text);
+    if (i < failedAt || results[i] == 0) {
+      EXPECT_TRUE(results[i] == 0 || i > failedAt) << where;
       EXPECT_TRUE(messages.empty()) << where;
-    } else if (result != 0) {
-      EXPECT_EQ(result, kFailure) << where;
-      EXPECT_EQ(messages.size(), 1u) << where << "the failure is reported once";
-      if (messages.empty()) continue;
-      EXPECT_EQ(messages[0].code, 256u) << where << messages[0].text;
-      if (failedIn[i]) {
-        EXPECT_EQ(messages[0].text, "std::bad_alloc") << where;
-      } else {
-        EXPECT_TRUE(isLibraryMessage(messages[0].text)) << where << messages[0].text;
-      }
+      continue;
+    }
+    EXPECT_EQ(results[i], 0x80000000u) << where;
+    EXPECT_EQ(messages.size(), 1u) << where << " (the failure is reported once)";
+    if (messages.empty()) continue;
+    EXPECT_EQ(messages[0].code, 256u) << where;
+    if (i == failedAt) {
+      EXPECT_EQ(messages[0].text, "std::bad_alloc") << where;
     } else {
-      EXPECT_TRUE(messages.empty()) << where << messages[0].text;
+      EXPECT_TRUE(isLibraryMessage(messages[0].text)) << where;
     }
   }
   scenario.checkUsable();
-  for (Call& call : calls) {
-    const uint32_t result = call.run();
-    const std::vector<Message> messages = scenario.takeMessages();
-    EXPECT_EQ(result, 0u) << "rerun " << call.name << ": "
-                          << (messages.empty() ? "" : messages[0].text);
+  scenario.recorder.take();  // the not-initialised failure of checkUsable when no core is left
+  for (auto& [name, call] : calls) {
+    EXPECT_EQ(call(), 0u) << "rerun " << name;
+    EXPECT_TRUE(scenario.recorder.take().empty()) << "rerun " << name;
   }
-  return metFailure;
+  return failedAt != calls.size();
 }
 
 TEST(AllocationFailure, EveryAllocationOfACallSequenceMayFail) {
-  runWithFailureAt(0);  // warm-up: the registries of the framework make their one-time allocations
+  runWithFailureAt(0);  // warm-up: the framework's registries make their one-time allocations
   const int64_t liveBefore = ZinStress::liveAllocations();
   uint64_t n = 1;
-  for (; n < 100000 && !::testing::Test::HasFailure(); ++n) {
-    if (!runWithFailureAt(n)) break;
+  for (; n < 100000 && !::testing::Test::HasFailure() && runWithFailureAt(n); ++n) {
     ASSERT_EQ(ZinStress::liveAllocations(), liveBefore) << "allocations leaked with N=" << n;
   }
   EXPECT_GT(n, 50u) << "the sequence makes allocations to fail";

@@ -1,11 +1,22 @@
 #include "support/SessionFixture.h"
 
 #include <cstdio>
+#include <stdexcept>
 
 #include "ZinRT/ZinJtag.h"
 #include "ZinRT/Zin_CoreList.h"
 
 namespace ZinTest {
+
+std::string logicErrorOf(const std::function<void()>& call) {
+  try {
+    call();
+  } catch (const std::logic_error& error) {
+    return error.what();
+  }
+  ADD_FAILURE() << "no std::logic_error";
+  return "";
+}
 
 void SessionFixture::SetUp() {
   transport = std::make_shared<ZinTarget::ScriptedTransport>();
@@ -21,7 +32,7 @@ void SessionFixture::TearDown() {
 void SessionFixture::onMessage(void* user, uint32_t messageHandle, uint32_t code,
                                const char* text) {
   auto* self = static_cast<SessionFixture*>(user);
-  bool locked = ZinJtag_session_isLocked(messageHandle);
+  const bool locked = ZinJtag_session_isLocked(messageHandle);
   std::lock_guard<std::mutex> guard(self->mutex_);
   self->messages_.push_back({code, text ? text : "<null>", locked});
 }
@@ -36,18 +47,31 @@ void SessionFixture::clearMessages() {
   messages_.clear();
 }
 
-void SessionFixture::expectOnlyError(const std::string& text) {
-  std::vector<RecordedMessage> recorded = messages();
-  ASSERT_EQ(recorded.size(), 1u) << "expected only \"" << text << "\"; first: \""
-                                 << (recorded.empty() ? "" : recorded[0].text) << "\"";
-  EXPECT_EQ(recorded[0].text, text);
-  EXPECT_EQ(recorded[0].code, kErrorCode);
-  EXPECT_FALSE(recorded[0].lockHeld) << "the frame reports after releasing the target lock";
+std::string SessionFixture::errorOf(uint32_t result) {
+  EXPECT_EQ(result, kFailure);
+  const std::vector<RecordedMessage> recorded = messages();
   clearMessages();
+  EXPECT_EQ(recorded.size(), 1u) << "first: " << (recorded.empty() ? "" : recorded[0].text);
+  if (recorded.empty()) return "";
+  EXPECT_EQ(recorded[0].code, kErrorCode) << recorded[0].text;
+  EXPECT_FALSE(recorded[0].lockHeld) << "the frame reports after releasing the target lock";
+  return recorded[0].text;
+}
+
+void SessionFixture::expectWrongCoreType(const std::string& text) {
+  const std::vector<RecordedMessage> recorded = messages();
+  clearMessages();
+  ASSERT_EQ(recorded.size(), 2u);
+  EXPECT_EQ(recorded[0].code, kErrorCode);
+  EXPECT_EQ(recorded[0].text, text);
+  EXPECT_TRUE(recorded[0].lockHeld);
+  EXPECT_EQ(recorded[1].code, kAbortCode);
+  EXPECT_EQ(recorded[1].text, "Zin abort command");
+  EXPECT_FALSE(recorded[1].lockHeld);
 }
 
 void SessionFixture::expectNoMessages() {
-  std::vector<RecordedMessage> recorded = messages();
+  const std::vector<RecordedMessage> recorded = messages();
   EXPECT_TRUE(recorded.empty()) << "unexpected message: \"" << recorded[0].text << "\"";
 }
 
@@ -61,8 +85,7 @@ ZinRT::ZinMOX_Core* SessionFixture::initMoxCore(const ZIN_CORE_REF& coreRef, uin
   status.syncOutputCount = syncOut;
   transport->placeMoxCore(coreRef, status);
   ZIN_CORE_REF copy = coreRef;
-  uint32_t result = ZinMOX_initCore(handle, &copy);
-  EXPECT_EQ(result, 0u) << "ZinMOX_initCore failed";
+  EXPECT_EQ(ZinMOX_initCore(handle, &copy), 0u) << "ZinMOX_initCore failed";
   ZinRT::ZinMOX_Core* core = registeredCore(coreRef);
   EXPECT_NE(core, nullptr) << "no MOX core registered after ZinMOX_initCore";
   transport->clearLog();
@@ -72,6 +95,20 @@ ZinRT::ZinMOX_Core* SessionFixture::initMoxCore(const ZIN_CORE_REF& coreRef, uin
 
 ZinRT::ZinMOX_Core* SessionFixture::registeredCore(const ZIN_CORE_REF& coreRef) const {
   return dynamic_cast<ZinRT::ZinMOX_Core*>(ZinRT::Zin_CoreList::getCore(handle, coreRef));
+}
+
+uint32_t SessionFixture::defineBus(const char* name, uint32_t type, std::vector<uint32_t> bits) {
+  return ZinMOX_defineBus(handle, &ref, name, type, bits.data(),
+                          static_cast<uint32_t>(bits.size()));
+}
+
+WriteImage SessionFixture::lastWrite(uint32_t asyncOut, uint32_t syncOut) {
+  const auto sent = transport->transfers();
+  if (sent.empty()) {
+    ADD_FAILURE() << "nothing was sent";
+    return WriteImage::zeros(asyncOut, syncOut);
+  }
+  return decodeWriteCommand(sent.back().text, linePrefix(ref), asyncOut, syncOut);
 }
 
 std::string SessionFixture::linePrefix(const ZIN_CORE_REF& coreRef) {

@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <mutex>
 #include <string>
@@ -13,6 +14,7 @@
 #include "ZinMOX/ZinMOX.h"
 #include "ZinMOX/ZinMOX_Core.h"
 #include "ZinTarget/ScriptedTransport.h"
+#include "support/WireFormat.h"
 
 namespace ZinTest {
 
@@ -28,6 +30,9 @@ inline constexpr uint32_t kFailure = 0x80000000u;
 inline constexpr uint32_t kErrorCode = 256;
 inline constexpr uint32_t kAbortCode = 32768;
 
+/// The text of the std::logic_error that `call` throws (a test failure if it throws none).
+std::string logicErrorOf(const std::function<void()>& call);
+
 /// Opens a session on a fresh ScriptedTransport in SetUp, records every message of the session
 /// (thread-safe), and closes the session in TearDown (which also destroys its registered cores).
 class SessionFixture : public ::testing::Test {
@@ -38,10 +43,14 @@ class SessionFixture : public ::testing::Test {
   /// The messages recorded so far, in delivery order.
   std::vector<RecordedMessage> messages() const;
   void clearMessages();
-  /// Checks that exactly one message was recorded: `text` with code 256, sent while the target
-  /// lock was free (the call frame reports after releasing it). Clears the record.
-  void expectOnlyError(const std::string& text);
-  /// Checks that no message was recorded.
+  /// Checks that `result` is a failure reported by exactly one message with code 256, sent
+  /// after the target lock was released, and returns its text. Clears the record.
+  std::string errorOf(uint32_t result);
+  /// errorOf for a call whose result was already checked.
+  void expectOnlyError(const std::string& text) { EXPECT_EQ(errorOf(kFailure), text); }
+  /// Checks for the two messages of a call on a core of the wrong type: `text` (code 256) while
+  /// the lock is held, then "Zin abort command" (code 32768) after it. Clears the record.
+  void expectWrongCoreType(const std::string& text);
   void expectNoMessages();
 
   /// Places a MOX core with the given port widths at `coreRef` (full status layout), runs
@@ -50,6 +59,9 @@ class SessionFixture : public ::testing::Test {
                                   uint32_t asyncOut, uint32_t syncOut);
   /// The MOX core registered at `coreRef`, or null.
   ZinRT::ZinMOX_Core* registeredCore(const ZIN_CORE_REF& coreRef) const;
+  uint32_t defineBus(const char* name, uint32_t type, std::vector<uint32_t> bits);
+  /// The image of the last write sequence sent to `ref` (a test failure if none was sent).
+  WriteImage lastWrite(uint32_t asyncOut, uint32_t syncOut);
 
   /// "DD C K " for a core reference, as the command lines start.
   static std::string linePrefix(const ZIN_CORE_REF& coreRef);

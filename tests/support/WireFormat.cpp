@@ -2,19 +2,13 @@
 
 #include <gtest/gtest.h>
 
+#include <cctype>
 #include <cstdio>
-#include <sstream>
+#include <cstring>
 
 namespace ZinTest {
 
 namespace {
-
-int hexDigitValue(char c) {
-  if (c >= '0' && c <= '9') return c - '0';
-  if (c >= 'A' && c <= 'F') return c - 'A' + 10;
-  if (c >= 'a' && c <= 'f') return c - 'a' + 10;
-  return -1;
-}
 
 std::string hex8(uint32_t value) {
   char text[16];
@@ -22,112 +16,63 @@ std::string hex8(uint32_t value) {
   return text;
 }
 
-}  // namespace
-
-std::vector<std::string> splitLines(const std::string& text) {
-  std::vector<std::string> lines;
-  std::size_t start = 0;
-  for (;;) {
-    std::size_t end = text.find('\n', start);
-    lines.push_back(text.substr(start, end == std::string::npos ? std::string::npos : end - start));
-    if (end == std::string::npos) break;
-    start = end + 1;
-  }
-  return lines;
-}
-
-CommandLine parseLine(const std::string& line) {
-  std::vector<std::string> fields;
-  std::size_t start = 0;
-  for (;;) {
-    std::size_t end = line.find(' ', start);
-    fields.push_back(
-        line.substr(start, end == std::string::npos ? std::string::npos : end - start));
-    if (end == std::string::npos) break;
-    start = end + 1;
-  }
-  bool wellFormed = fields.size() == 7;
-  for (const std::string& field : fields) wellFormed = wellFormed && !field.empty();
-  if (!wellFormed) {
-    ADD_FAILURE() << "malformed command line: \"" << line << "\"";
-    return {};
-  }
-  return {fields[0], fields[1], fields[2], fields[3], fields[4], fields[5], fields[6]};
-}
-
+// The `n` least significant bits of a hexadecimal text, most significant first; a bad digit or
+// a set bit above them is a test failure.
 std::string hexToBits(const std::string& hex, std::size_t n) {
   std::string all;
   for (char c : hex) {
-    int digit = hexDigitValue(c);
-    if (digit < 0) {
-      ADD_FAILURE() << "not a hexadecimal text: \"" << hex << "\"";
-      return std::string(n, '?');
-    }
+    const char* digits = "0123456789ABCDEF";
+    const char* at = std::strchr(digits, std::toupper(static_cast<unsigned char>(c)));
+    if (c == '\0' || at == nullptr) ADD_FAILURE() << "not hexadecimal: \"" << hex << "\"";
+    const int digit = at != nullptr ? static_cast<int>(at - digits) : 0;
     for (int bit = 3; bit >= 0; --bit) all.push_back(((digit >> bit) & 1) ? '1' : '0');
   }
   if (all.size() < n) all.insert(0, n - all.size(), '0');
-  std::string high = all.substr(0, all.size() - n);
-  if (high.find('1') != std::string::npos) {
-    ADD_FAILURE() << "hexadecimal text \"" << hex << "\" has bits set above bit " << n;
-  }
+  EXPECT_EQ(all.substr(0, all.size() - n).find('1'), std::string::npos)
+      << "\"" << hex << "\" has bits set above bit " << n;
   return all.substr(all.size() - n);
 }
 
+}  // namespace
+
 std::string bitsToHex(const std::string& bits) {
-  std::string padded = std::string((4 - bits.size() % 4) % 4, '0') + bits;
+  const std::string padded = std::string((4 - bits.size() % 4) % 4, '0') + bits;
   std::string hex;
   for (std::size_t i = 0; i < padded.size(); i += 4) {
-    int digit = 0;
-    for (std::size_t j = 0; j < 4; ++j) digit = digit * 2 + (padded[i + j] == '1' ? 1 : 0);
-    hex.push_back("0123456789ABCDEF"[digit]);
+    hex.push_back("0123456789ABCDEF"[std::stoi(padded.substr(i, 4), nullptr, 2)]);
   }
   return hex;
 }
 
 WriteImage WriteImage::zeros(uint32_t asyncOut, uint32_t syncOut) {
-  WriteImage image;
-  image.asyncValues.assign(asyncOut, '0');
-  image.steps.assign(syncOut, std::string(16, '0'));
-  image.asyncUpdate.assign(asyncOut, '0');
-  image.syncUpdate.assign(syncOut, '0');
-  return image;
-}
-
-std::string writeBits(const WriteImage& image) {
-  std::string bits = image.asyncValues;
-  for (const std::string& steps : image.steps) bits += steps;
-  return bits + image.asyncUpdate + image.syncUpdate;
+  return {std::string(asyncOut, '0'), std::vector<std::string>(syncOut, std::string(16, '0')),
+          std::string(asyncOut, '0'), std::string(syncOut, '0')};
 }
 
 std::string writeDataHex(const WriteImage& image) {
-  return bitsToHex(writeBits(image));
-}
-
-WriteImage decodeWriteData(const std::string& dataHex, uint32_t asyncOut, uint32_t syncOut) {
-  std::string bits = hexToBits(dataHex, 2u * asyncOut + 17u * syncOut);
-  WriteImage image;
-  std::size_t pos = 0;
-  image.asyncValues = bits.substr(pos, asyncOut);
-  pos += asyncOut;
-  for (uint32_t i = 0; i < syncOut; ++i, pos += 16) image.steps.push_back(bits.substr(pos, 16));
-  image.asyncUpdate = bits.substr(pos, asyncOut);
-  pos += asyncOut;
-  image.syncUpdate = bits.substr(pos, syncOut);
-  return image;
+  std::string bits = image.asyncValues;
+  for (const std::string& steps : image.steps) bits += steps;
+  return bitsToHex(bits + image.asyncUpdate + image.syncUpdate);
 }
 
 WriteImage decodeWriteCommand(const std::string& text, const std::string& prefix, uint32_t asyncOut,
                               uint32_t syncOut) {
-  std::vector<std::string> lines = splitLines(text);
-  if (lines.size() != 2) {
-    ADD_FAILURE() << "a write sequence has two lines: \"" << text << "\"";
+  const std::string head = prefix + "01 0 " + hex8(2 * asyncOut + 17 * syncOut + 1) + " ";
+  const std::string tail = "\n" + prefix + "02 0 00000004 0";
+  const bool framed = text.size() > head.size() + tail.size() && text.rfind(head, 0) == 0 &&
+                      text.substr(text.size() - tail.size()) == tail;
+  if (!framed) {
+    ADD_FAILURE() << "not a write sequence for " << asyncOut << "/" << syncOut << ": " << text;
     return WriteImage::zeros(asyncOut, syncOut);
   }
-  const std::string head = prefix + "01 0 " + hex8(2 * asyncOut + 17 * syncOut + 1) + " ";
-  EXPECT_EQ(lines[0].substr(0, head.size()), head) << text;
-  EXPECT_EQ(lines[1], prefix + "02 0 00000004 0") << text;
-  CommandLine line = parseLine(lines[0]);
-  return decodeWriteData(line.data, asyncOut, syncOut);
+  const std::string data = text.substr(head.size(), text.size() - head.size() - tail.size());
+  const std::string bits = hexToBits(data, 2u * asyncOut + 17u * syncOut);
+  WriteImage image;
+  image.asyncValues = bits.substr(0, asyncOut);
+  for (uint32_t i = 0; i < syncOut; ++i) image.steps.push_back(bits.substr(asyncOut + 16 * i, 16));
+  image.asyncUpdate = bits.substr(asyncOut + 16 * syncOut, asyncOut);
+  image.syncUpdate = bits.substr(2 * asyncOut + 16 * syncOut);
+  return image;
 }
 
 std::string readCommandText(const std::string& prefix, uint32_t asyncIn, uint32_t syncIn) {
@@ -136,63 +81,45 @@ std::string readCommandText(const std::string& prefix, uint32_t asyncIn, uint32_
 }
 
 uint32_t readBitCount(uint32_t asyncIn, uint32_t syncIn) {
-  uint32_t length = 4 * asyncIn + 6 * syncIn + 16;
-  return 8 * ((length + 7) / 8) + 8;
+  return 8 * ((4 * asyncIn + 6 * syncIn + 16 + 7) / 8) + 8;
 }
 
 InputImage InputImage::zeros(uint32_t asyncIn, uint32_t syncIn) {
-  InputImage image;
-  for (std::string* s : {&image.asyncValue, &image.asyncUp, &image.asyncDown}) {
-    s->assign(asyncIn, '0');
-  }
-  for (std::string* s :
-       {&image.syncValue, &image.syncUp, &image.syncDown, &image.syncSyncUp, &image.syncSyncDown}) {
-    s->assign(syncIn, '0');
-  }
-  return image;
+  const std::string a(asyncIn, '0'), s(syncIn, '0');
+  return {a, a, a, s, s, s, s, s};
 }
 
 InputImage InputImage::random(uint32_t asyncIn, uint32_t syncIn, std::mt19937& rng) {
   InputImage image = zeros(asyncIn, syncIn);
-  std::bernoulli_distribution coin(0.5);
-  for (std::string* s : {&image.asyncValue, &image.asyncUp, &image.asyncDown, &image.syncValue,
-                         &image.syncUp, &image.syncDown, &image.syncSyncUp, &image.syncSyncDown}) {
-    for (char& c : *s) c = coin(rng) ? '1' : '0';
+  for (const std::string* s : image.vectors()) {
+    for (char& c : const_cast<std::string&>(*s)) c = (rng() & 1) != 0 ? '1' : '0';
   }
   return image;
 }
 
-std::string inputBits(const InputImage& image, char unused) {
-  std::string bits;
-  for (uint32_t i = 0; i < image.asyncCount(); ++i) {
-    bits += {image.asyncValue[i], image.asyncUp[i], image.asyncDown[i], unused};
-  }
-  for (uint32_t i = 0; i < image.syncCount(); ++i) {
-    bits += {image.syncValue[i],  image.syncUp[i],       image.syncDown[i],
-             image.syncSyncUp[i], image.syncSyncDown[i], unused};
-  }
-  return bits;
-}
-
-std::vector<unsigned char> readDataFor(const std::string& bits, uint32_t readBits, bool junkAbove) {
-  std::vector<unsigned char> bytes((readBits + 7) / 8, 0);
-  const std::size_t n = bits.size();
-  for (std::size_t k = 0; k < n; ++k) {
-    if (bits[k] != '1') continue;
-    std::size_t bit = n - 1 - k;
-    bytes[bit / 8] |= static_cast<unsigned char>(1u << (bit % 8));
-  }
-  if (junkAbove) {
-    for (std::size_t bit = n; bit < bytes.size() * 8; ++bit) {
-      bytes[bit / 8] |= static_cast<unsigned char>(1u << (bit % 8));
-    }
-  }
-  return bytes;
+std::vector<const std::string*> InputImage::vectors() const {
+  return {&asyncValue, &asyncUp,  &asyncDown,  &syncValue,
+          &syncUp,     &syncDown, &syncSyncUp, &syncSyncDown};
 }
 
 std::vector<unsigned char> readDataFor(const InputImage& image) {
-  return readDataFor(inputBits(image, '1'), readBitCount(image.asyncCount(), image.syncCount()),
-                     true);
+  std::string bits;
+  for (std::size_t i = 0; i < image.asyncValue.size(); ++i) {
+    bits += {image.asyncValue[i], image.asyncUp[i], image.asyncDown[i], '1'};
+  }
+  for (std::size_t i = 0; i < image.syncValue.size(); ++i) {
+    bits += {image.syncValue[i],  image.syncUp[i],       image.syncDown[i],
+             image.syncSyncUp[i], image.syncSyncDown[i], '1'};
+  }
+  const uint32_t total = readBitCount(static_cast<uint32_t>(image.asyncValue.size()),
+                                      static_cast<uint32_t>(image.syncValue.size()));
+  std::vector<unsigned char> bytes(total / 8, 0xFF);  // junk above the input bits
+  const std::size_t n = bits.size();
+  for (std::size_t k = 0; k < n; ++k) {
+    const std::size_t bit = n - 1 - k;
+    if (bits[k] == '0') bytes[bit / 8] &= static_cast<unsigned char>(~(1u << (bit % 8)));
+  }
+  return bytes;
 }
 
 std::vector<uint8_t> packBits(const std::string& bits) {
@@ -218,14 +145,11 @@ std::vector<uint8_t> packValue(uint64_t value, std::size_t bytes) {
 void setStatusBits(std::vector<unsigned char>& word, uint32_t offset, uint32_t length,
                    uint32_t value) {
   for (uint32_t i = 0; i < length; ++i) {
-    uint32_t bit = offset + i;
+    const uint32_t bit = offset + i;
     if (word.size() <= bit / 8) word.resize(bit / 8 + 1, 0);
-    auto mask = static_cast<unsigned char>(1u << (bit % 8));
-    if ((value >> i) & 1u) {
-      word[bit / 8] |= mask;
-    } else {
-      word[bit / 8] &= static_cast<unsigned char>(~mask);
-    }
+    const auto mask = static_cast<unsigned char>(1u << (bit % 8));
+    word[bit / 8] = static_cast<unsigned char>(((value >> i) & 1u) != 0 ? word[bit / 8] | mask
+                                                                        : word[bit / 8] & ~mask);
   }
 }
 

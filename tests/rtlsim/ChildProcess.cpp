@@ -1,0 +1,130 @@
+// A child process of a test, and loopback socket helpers.
+#include "ChildProcess.h"
+
+#include <arpa/inet.h>
+#include <fcntl.h>
+#include <netinet/in.h>
+#include <poll.h>
+#include <signal.h>
+#include <spawn.h>
+#include <sys/socket.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <stdexcept>
+#include <thread>
+
+extern char** environ;
+
+namespace ZinRtlTest {
+
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+int msLeft(Clock::time_point end) {
+  const auto left = std::chrono::duration_cast<std::chrono::milliseconds>(end - Clock::now());
+  return left.count() > 0 ? static_cast<int>(left.count()) : 0;
+}
+
+sockaddr_in loopback(int port) {
+  sockaddr_in address{};
+  address.sin_family = AF_INET;
+  address.sin_port = htons(static_cast<uint16_t>(port));
+  address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+  return address;
+}
+
+}  // namespace
+
+ChildProcess::ChildProcess(const std::string& path, const std::vector<std::string>& args) {
+  int fds[2];
+  if (pipe2(fds, O_CLOEXEC) != 0) throw std::runtime_error("pipe failed");
+  std::vector<char*> argv{const_cast<char*>(path.c_str())};
+  for (const std::string& arg : args) argv.push_back(const_cast<char*>(arg.c_str()));
+  argv.push_back(nullptr);
+  posix_spawn_file_actions_t actions;
+  posix_spawn_file_actions_init(&actions);
+  posix_spawn_file_actions_adddup2(&actions, fds[1], 1);
+  posix_spawn_file_actions_adddup2(&actions, fds[1], 2);
+  const int rc = posix_spawn(&pid_, path.c_str(), &actions, nullptr, argv.data(), environ);
+  posix_spawn_file_actions_destroy(&actions);
+  close(fds[1]);
+  out_ = fds[0];
+  if (rc != 0) {
+    pid_ = -1;
+    throw std::runtime_error("cannot start " + path);
+  }
+}
+
+ChildProcess::~ChildProcess() {
+  if (pid_ > 0) {
+    kill(pid_, SIGKILL);
+    waitpid(pid_, nullptr, 0);
+  }
+  if (out_ >= 0) close(out_);
+}
+
+void ChildProcess::drain(int timeoutMs) {
+  pollfd readable{out_, POLLIN, 0};
+  if (poll(&readable, 1, timeoutMs) <= 0) return;
+  char buffer[4096];
+  const ssize_t n = read(out_, buffer, sizeof buffer);
+  if (n > 0) output_.append(buffer, static_cast<size_t>(n));
+  if (n == 0) std::this_thread::sleep_for(std::chrono::milliseconds(std::min(timeoutMs, 10)));
+}
+
+bool ChildProcess::waitForOutput(const std::string& text, int timeoutMs) {
+  const auto end = Clock::now() + std::chrono::milliseconds(timeoutMs);
+  while (output_.find(text) == std::string::npos) {
+    if (msLeft(end) == 0) return false;
+    drain(msLeft(end));
+  }
+  return true;
+}
+
+void ChildProcess::signal(int number) {
+  if (pid_ > 0) kill(pid_, number);
+}
+
+int ChildProcess::wait(int timeoutMs) {
+  const auto end = Clock::now() + std::chrono::milliseconds(timeoutMs);
+  int status = 0;
+  while (waitpid(pid_, &status, WNOHANG) == 0) {
+    if (msLeft(end) == 0) {
+      kill(pid_, SIGKILL);
+      waitpid(pid_, &status, 0);
+      pid_ = -1;
+      return -1;
+    }
+    drain(std::min(msLeft(end), 20));
+  }
+  pid_ = -1;
+  drain(0);
+  return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+}
+
+int freeLoopbackPort() {
+  const int fd = socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
+  sockaddr_in address = loopback(0);
+  socklen_t length = sizeof address;
+  bind(fd, reinterpret_cast<sockaddr*>(&address), sizeof address);
+  getsockname(fd, reinterpret_cast<sockaddr*>(&address), &length);
+  close(fd);
+  return ntohs(address.sin_port);
+}
+
+int connectLoopback(int port, int timeoutMs) {
+  const auto end = Clock::now() + std::chrono::milliseconds(timeoutMs);
+  while (true) {
+    const int fd = socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
+    const sockaddr_in address = loopback(port);
+    if (connect(fd, reinterpret_cast<const sockaddr*>(&address), sizeof address) == 0) return fd;
+    close(fd);
+    if (msLeft(end) == 0) return -1;
+    std::this_thread::sleep_for(std::chrono::milliseconds(50));
+  }
+}
+
+}  // namespace ZinRtlTest
