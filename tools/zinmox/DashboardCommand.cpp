@@ -43,7 +43,8 @@ void runDashboard(Session& session, const DashboardArgs& args) {
   dashboard::HostLink host(session);
   dashboard::Server server(host, endpoint.host, endpoint.port);
   try {
-    const std::string target = host.targetName();  // opens the target: fail before serving
+    host.scan();  // opens the target and lists its cores: a bad target fails before serving
+    const std::string target = host.targetName();
     server.start();
     if (!args.core.empty()) server.hub().configure(args.core, args.rateHz, std::nullopt);
     std::cout << "zinmox dashboard: serving " << target << " at http://" << server.address()
