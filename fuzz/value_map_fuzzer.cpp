@@ -78,7 +78,7 @@ void checkStaged(const ZinRT::ZinMOX_Command& image, const Defined& signal,
       if (image.getAsyncOutValueBits()[p] != want || image.getAsyncOutUpdateBits()[p] != '1') {
         fail("asynchronous output bit " + std::to_string(p) + " staged wrong");
       }
-    } else if (image.getSyncOutPulseTrains()[p] != std::string(16, want) ||
+    } else if (image.getPulseTrain(p) != std::string(16, want) ||
                image.getSyncOutUpdateBits()[p] != '1') {
       fail("synchronous output bit " + std::to_string(p) + " staged wrong");
     }

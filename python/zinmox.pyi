@@ -83,8 +83,10 @@ class Core:
     @property
     def info(self) -> dict[str, int]:
         """The twelve information fields (manufacturer_id ... sync_output_count) as ints."""
-    def define(self, name: str, port: Port, bits: int | Sequence[int]) -> None:
-        """Names one port bit, or a list of them (a bus; value bit i is port bit bits[i])."""
+    def define(self, name: str, port: Port, bits: int | Sequence[int] | str) -> None:
+        """Names one port bit, a list of them (a bus; value bit i is port bit bits[i]) or a
+        bit-list text such as "0-7" (at most the port's width). A bit listed twice, or an
+        output name with '.' or '=', raises ValueError."""
     def undefine(self, name: str, port: Port) -> None: ...
     @overload
     def sizes(self, names: str, output: bool = True) -> int: ...
@@ -92,8 +94,8 @@ class Core:
     def sizes(self, names: list[str] | tuple[str, ...], output: bool = True) -> list[int]: ...
     def write(self, values: Mapping[str, WriteValue] | None = None, /, **signals: WriteValue) -> None:
         """Writes named outputs in one transfer. An int must be non-negative and fit the
-        signal; a hex text is passed on as it is (a shorter text is sign-extended, a longer one
-        keeps its last digits); a list of 16 steps is a pulse train, step 0 first."""
+        signal; a hex text may start with "0x", which is removed (a shorter text is sign-extended,
+        a longer one keeps its last digits); a list of 16 steps is a pulse train, step 0 first."""
     def read(self) -> dict[str, Reading]:
         """Reads every input signal in one transfer; reading clears the activity latches."""
     @property
@@ -106,7 +108,8 @@ class SimTarget:
         """Rewires one input bit: 0, 1, or a source dict such as {"kind": "square",
         "period": 8}, {"kind": "counter", "bit": 0} or {"kind": "loopback", "output": "async",
         "bit": 3}."""
-    def advance(self, cycles: int) -> None: ...
+    def advance(self, cycles: int) -> None:
+        """Lets cycles pass on every MOX core; OverflowError past a cycle count of 2**64-1."""
     def set_cycles_per_sequence(self, cycles: int) -> None: ...
     def levels(self, ref: CoreRef, port: Port) -> int:
         """The levels of a port, bit i = port bit i."""

@@ -30,6 +30,10 @@ MOX = r"^(CallFrame|StatusRead|Ports|PortBits|SignalTable|WriteValues|ValueWire|
 MOX_TARGETS = ["zin_mox_tests"]
 SIM = r"^(ModelTest|ModelLargeCore|ModelThreads|EndToEnd|Description)\."
 SIM_TARGETS = ["zin_sim_tests"]
+TOOL = r"^(HostText|ClientCases|ErrorPaths|Script|JsonOutput|Demo|Serve)\."
+TOOL_TARGETS = ["zinmox_tool_tests", "zinmox"]
+PYTHON = r"^python_"
+PYTHON_TARGETS = ["zinmox_python", "zinmox"]
 
 
 @dataclasses.dataclass
@@ -61,8 +65,8 @@ FAULTS = [
           'storeText(map, keyOf(".activity_down"), vectors, bytes, width);'),
     Fault("step order: step vectors of steps 0..7 taken in reverse",
           "src/ZinMOX/command/ZinMOX_StepVectors.cpp",
-          "early |= uint64_t{vectors[t * stepBytes + byte]} << (8 * t);",
-          "early |= uint64_t{vectors[(7 - t) * stepBytes + byte]} << (8 * t);"),
+          "early |= uint64_t{vectors[t][byte]} << (8 * t);",
+          "early |= uint64_t{vectors[7 - t][byte]} << (8 * t);"),
     Fault("step order: the next step vector is taken one step late",
           "src/ZinMOX/signals/ZinMOX_SignalGroup.cpp",
           "if (step + 1 < stepCount) vector += bytes;",
@@ -158,10 +162,36 @@ FAULTS = [
           "src/ZinSim/CommandParser.cpp",
           "const char expected = cmd.code >= kRead ? '1' : '0';",
           "const char expected = cmd.code > kRead ? '1' : '0';", SIM, SIM_TARGETS),
+    Fault("sim clear: a read that lets no time pass clears only activity up",
+          "src/ZinSim/MoxModel.cpp",
+          "for (Input& in : asyncIn_) in.up = in.down = 0;",
+          "for (Input& in : asyncIn_) in.up = 0;", SIM, SIM_TARGETS),
     Fault("sim clear: the clock edge after a read clears only activity up",
           "src/ZinSim/MoxInputs.cpp",
           "for (Input& in : asyncIn_) in.up = in.down = 0;",
           "for (Input& in : asyncIn_) in.up = 0;", SIM, SIM_TARGETS),
+    # --- the host library of the tool and the Python module, and the module itself ------------
+    Fault("host bit list: a list exactly as wide as the port refused",
+          "src/ZinHost/BitList.cpp",
+          "if (bits_.size() + count > maxBits_) {",
+          "if (bits_.size() + count >= maxBits_) {", TOOL, TOOL_TARGETS),
+    Fault("host digit order: a whole-port hex vector read from its first digit",
+          "src/ZinHost/ValueText.cpp",
+          "const unsigned value = digitValue(digits[digitCount - 1 - d]);",
+          "const unsigned value = digitValue(digits[d]);", TOOL, TOOL_TARGETS),
+    Fault("host sign extension: a step text starting with digit 8 taken as positive",
+          "src/ZinHost/ValueText.cpp",
+          "digitValue(digits[0]) >= 8 ? 0xF : 0;",
+          "digitValue(digits[0]) > 8 ? 0xF : 0;", TOOL, TOOL_TARGETS),
+    Fault("python width check: an int as wide as its signal refused",
+          "python/src/Values.cpp",
+          'if (value.attr("bit_length")().cast<uint64_t>() > bits) {',
+          'if (value.attr("bit_length")().cast<uint64_t>() >= bits) {', PYTHON, PYTHON_TARGETS),
+    Fault("python byte order: an int written most significant byte first",
+          "python/src/Values.cpp",
+          'return value.attr("to_bytes")(bytes, "little").cast<std::string>();',
+          'return value.attr("to_bytes")(bytes, "big").cast<std::string>();', PYTHON,
+          PYTHON_TARGETS),
 ]
 
 

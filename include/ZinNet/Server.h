@@ -25,9 +25,13 @@ struct ServerOptions {
   uint32_t frameTimeoutMs = 10000;
   /// A reply must be taken by the client within this time.
   uint32_t writeTimeoutMs = 10000;
-  /// A connection that sends nothing for this long is closed (0: never).
-  uint32_t idleTimeoutMs = 0;
-  /// Further connections are told the server is busy and closed.
+  /// A new connection must have sent its hello within this time (0: no limit).
+  uint32_t greetingTimeoutMs = 5000;
+  /// A connection that sends no frame for this long after its last reply is closed (0: never).
+  uint32_t idleTimeoutMs = 60000;
+  /// Clients connected at once. When a new one comes and all places are taken, the connection
+  /// that has been waiting longest for its next request to arrive is closed to make room; when
+  /// every connection has a request in progress, the new one is told the server is busy.
   uint32_t maxClients = 64;
   /// Announced to clients in the welcome.
   std::string name = "ZinNet target server";

@@ -25,8 +25,11 @@ ZINJTAG_API uint32_t ZinJtag_openSession(std::shared_ptr<ZinRT::Zin_Transport> t
 /// becomes unknown, then the transport is released (once no target lock holds the session any
 /// more). Throws std::invalid_argument for an unknown handle or a session that another thread is
 /// closing. A hook that throws does not keep the session open: the other hooks still run, the
-/// session is closed, then the first exception is passed on. Must not be called while another
-/// thread is inside a call on the same session.
+/// session is closed, then the first exception is passed on. The close takes the session's target
+/// lock first, so it waits for a call in progress on another thread; calls that wait for the lock
+/// then fail with "ZinJtag: session N was closed while the call waited for its target lock", and
+/// later calls find no session with the handle. Must not be called from inside a call on the same
+/// session (from its message handler, say).
 ZINJTAG_API void ZinJtag_closeSession(uint32_t handle);
 
 /// Registers the message handler of a session (null restores the default, which writes

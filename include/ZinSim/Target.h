@@ -62,7 +62,10 @@ class ZINSIM_API Target : public ZinRT::Zin_Transport {
   /// Sets the cycles that pass with each command sequence, for every MOX core.
   void setCyclesPerSequence(uint32_t cycles);
 
-  /// The texts of the latest command sequences received (rejected ones included), oldest first.
+  /// Bytes of text the command log keeps in all; a longer text keeps only its beginning.
+  static constexpr size_t kCommandLogBytes = size_t{8} << 20;
+  /// The texts of the latest command sequences received (rejected ones included), oldest first,
+  /// at most kCommandLogBytes of them.
   std::vector<std::string> commandLog() const;
   void clearCommandLog();
   /// How many texts the log keeps (default 1000; the oldest are dropped).

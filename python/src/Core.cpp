@@ -5,6 +5,8 @@
 #include <utility>
 
 #include "Convert.h"
+#include "ZinHost/BitList.h"
+#include "ZinHost/Signals.h"
 #include "ZinMOX/ZinMOX_CoreInfoFields.h"
 
 namespace py = pybind11;
@@ -13,30 +15,27 @@ namespace zinmox {
 
 namespace {
 
-uint32_t portCode(const std::string& port) {
-  if (port == "sync_out") return ZINMOX_SYNC_OUTPUT;
-  if (port == "sync_in") return ZINMOX_SYNC_INPUT;
-  if (port == "async_out") return ZINMOX_ASYNC_OUTPUT;
-  if (port == "async_in") return ZINMOX_ASYNC_INPUT;
-  throw py::value_error("unknown port \"" + port +
-                        "\": expected \"sync_out\", \"sync_in\", \"async_out\" or \"async_in\"");
-}
-
 void checkName(const std::string& name) {
   if (name.find('\0') != std::string::npos) {
     throw py::value_error("a signal name must not contain a NUL character");
   }
 }
 
-std::vector<uint32_t> bitList(const py::handle& bits) {
-  if (py::isinstance<py::str>(bits) || py::isinstance<py::bytes>(bits) ||
-      !py::isinstance<py::sequence>(bits)) {
-    throw py::type_error("bits must be an int or a sequence of ints, not " + typeName(bits));
+// A sequence of bit numbers, or a bit-list text ("0-7") capped at the port's width; either
+// without a bit listed twice.
+std::vector<uint32_t> bitList(Core& core, ZinHost::Port port, const py::handle& bits) {
+  if (py::isinstance<py::str>(bits)) {
+    return ZinHost::parseBitList(bits.cast<std::string>(), ZinHost::portWidth(core.info(), port));
+  }
+  if (py::isinstance<py::bytes>(bits) || !py::isinstance<py::sequence>(bits)) {
+    throw py::type_error("bits must be an int, a sequence of ints or a bit-list str, not " +
+                         typeName(bits));
   }
   std::vector<uint32_t> list;
   for (const py::handle item : py::reinterpret_borrow<py::sequence>(bits)) {
     list.push_back(toUint32(item, "a bit index"));
   }
+  ZinHost::checkBitList(list, UINT32_MAX);  // the width is the library's to check
   return list;
 }
 
@@ -61,7 +60,7 @@ void Core::terminate() {
        [](uint32_t handle, ZIN_CORE_REF* ref) { return ZinMOX_terminateCore(handle, ref); });
 }
 
-py::dict Core::info() {
+py::dict Core::infoFields() {
   ZinRT::ZinMOX_ValueMap map;
   call("ZinMOX_getCoreInfo", [&](uint32_t handle, ZIN_CORE_REF* ref) {
     uintptr_t word = reinterpret_cast<uintptr_t>(&map);
@@ -75,9 +74,12 @@ py::dict Core::info() {
   return info;
 }
 
-void Core::define(const std::string& name, const std::string& port, const py::handle& bits) {
-  checkName(name);
-  const uint32_t code = portCode(port);
+void Core::define(const py::handle& nameObject, const py::handle& portObject,
+                  const py::handle& bits) {
+  const std::string name = toCText(nameObject, "a signal name");
+  const ZinHost::Port port = ZinHost::parsePort(toCText(portObject, "the port"));
+  ZinHost::checkSignalName(name, port);
+  const uint32_t code = ZinHost::portSignalType(port);
   if (py::isinstance<py::int_>(bits) && !py::isinstance<py::bool_>(bits)) {
     const uint32_t bit = toUint32(bits, "a bit index");
     call("ZinMOX_defineSignal", [&](uint32_t handle, ZIN_CORE_REF* ref) {
@@ -85,7 +87,7 @@ void Core::define(const std::string& name, const std::string& port, const py::ha
     });
     return;
   }
-  std::vector<uint32_t> list = bitList(bits);
+  std::vector<uint32_t> list = bitList(*this, port, bits);
   const uint32_t none = 0;  // an empty bus is the library's to refuse, with its own message
   call("ZinMOX_defineBus", [&](uint32_t handle, ZIN_CORE_REF* ref) {
     return ZinMOX_defineBus(handle, ref, name.c_str(), code, list.empty() ? &none : list.data(),
@@ -93,9 +95,10 @@ void Core::define(const std::string& name, const std::string& port, const py::ha
   });
 }
 
-void Core::undefine(const std::string& name, const std::string& port) {
-  checkName(name);
-  const uint32_t code = portCode(port);
+void Core::undefine(const py::handle& nameObject, const py::handle& portObject) {
+  const std::string name = toCText(nameObject, "a signal name");
+  const uint32_t code =
+      ZinHost::portSignalType(ZinHost::parsePort(toCText(portObject, "the port")));
   call("ZinMOX_undefineName", [&](uint32_t handle, ZIN_CORE_REF* ref) {
     return ZinMOX_undefineName(handle, ref, name.c_str(), code);
   });
@@ -118,15 +121,20 @@ std::vector<uint32_t> Core::sizes(const std::vector<std::string>& names, bool ou
   return result;
 }
 
-const PortWidths& Core::widths() {
-  if (!widths_) {
-    ZINMOX_CORE_INFO info{};
+const ZINMOX_CORE_INFO& Core::info() {
+  if (!info_) {
+    ZINMOX_CORE_INFO read{};
     call("ZinMOX_getInfo",
-         [&](uint32_t handle, ZIN_CORE_REF* ref) { return ZinMOX_getInfo(handle, ref, &info); });
-    widths_ = PortWidths{info.async_output_count, info.sync_output_count, info.async_input_count,
-                         info.sync_input_count};
+         [&](uint32_t handle, ZIN_CORE_REF* ref) { return ZinMOX_getInfo(handle, ref, &read); });
+    info_ = read;
   }
-  return *widths_;
+  return *info_;
+}
+
+PortWidths Core::widths() {
+  const ZINMOX_CORE_INFO& read = info();
+  return PortWidths{read.async_output_count, read.sync_output_count, read.async_input_count,
+                    read.sync_input_count};
 }
 
 py::dict infoDict(const ZINMOX_CORE_INFO& info) {

@@ -37,18 +37,24 @@ class Core {
 
   void init();
   void terminate();
-  pybind11::dict info();
-  void define(const std::string& name, const std::string& port, const pybind11::handle& bits);
-  void undefine(const std::string& name, const std::string& port);
+  /// The twelve fields of a fresh status read (the core need not be initialised).
+  pybind11::dict infoFields();
+  /// Names port bits: `bits` is an int, a sequence of ints or a bit-list text. Names with '.'
+  /// or '=' and bits listed twice raise ValueError; a name that is not a str, TypeError.
+  void define(const pybind11::handle& name, const pybind11::handle& port,
+              const pybind11::handle& bits);
+  void undefine(const pybind11::handle& name, const pybind11::handle& port);
   std::vector<uint32_t> sizes(const std::vector<std::string>& names, bool output);
 
-  /// The port widths from the core's status, read once.
-  const PortWidths& widths();
+  /// The core's information from its status (port widths and versions), read once.
+  const ZINMOX_CORE_INFO& info();
+  /// The port widths of info().
+  PortWidths widths();
 
  private:
   std::shared_ptr<SessionState> session_;
   ZIN_CORE_REF ref_;
-  std::optional<PortWidths> widths_;
+  std::optional<ZINMOX_CORE_INFO> info_;
 };
 
 /// The twelve fields of the information record as a dict of ints, in field order.

@@ -51,12 +51,14 @@ void bindCore(py::module_& module) {
           "signals \"async_out_data\", \"sync_out_data\", \"async_in_data\" and \"sync_in_data\". "
           "A core set up before loses its names. Returns the core.")
       .def("terminate", &Core::terminate, "Drops the core's object and its names.")
-      .def_property_readonly("info", &Core::info,
+      .def_property_readonly("info", &Core::infoFields,
                              "The twelve fields of the core's information as a dict of ints "
                              "(a fresh status read; the core need not be initialised).")
       .def("define", &Core::define, arg("name"), arg("port"), arg("bits"),
            "Names port bits. port: \"sync_out\", \"sync_in\", \"async_out\" or \"async_in\". "
-           "bits: one bit index, or a list of them (a bus; value bit i is port bit bits[i]).")
+           "bits: one bit index, a list of them (a bus; value bit i is port bit bits[i]) or a "
+           "bit-list str such as \"0-7\", \"7-0\" or \"0,2,4\" (at most the port's width). A bit "
+           "listed twice, and an output name with '.' or '=', raise ValueError.")
       .def("undefine", &Core::undefine, arg("name"), arg("port"),
            "Removes a name. Input ports search the inputs, output ports the outputs.")
       .def("sizes", &sizes, arg("names"), arg("output") = true,
@@ -65,8 +67,9 @@ void bindCore(py::module_& module) {
       .def("write", &writeValues, arg("values") = py::none(), py::pos_only(),
            "Writes named outputs in one transfer: write({\"ctl\": 0x3F}) or write(ctl=0x3F).\n\n"
            "A value is a non-negative int that fits the signal, a hex text (most significant "
-           "digit first, passed on as it is: a shorter text is sign-extended, a longer one keeps "
-           "its last digits), or a list of 16 step values (ints or hex texts) for a pulse train "
+           "digit first, optionally after \"0x\": a shorter text is sign-extended, a longer one "
+           "keeps its last digits), or a list of 16 step values (ints or hex texts) for a pulse "
+           "train "
            "on a synchronous output, step 0 first. A key may carry the library's suffix "
            "\".pulsetrain\" with a hex text or an int holding the 16 packed steps.")
       .def("read", &readValues,

@@ -10,9 +10,9 @@
 
 namespace zinmox {
 
-/// A tuple or list of three ints, or a text "D:C:I" whose numbers are decimal or 0x hex.
-/// Raises TypeError for other types and ValueError for malformed texts or numbers outside
-/// 0 to 2**32-1.
+/// A tuple or list of three ints, or a text "D:C:I" whose numbers are decimal or 0x hex, within
+/// the host library's limits (device 0 to 255, chain and core 0 to 15). Raises TypeError for
+/// other types and ValueError (ZinHost::TextError) for malformed texts or numbers out of range.
 ZIN_CORE_REF toCoreRef(const pybind11::handle& ref);
 
 pybind11::tuple refTuple(const ZIN_CORE_REF& ref);

@@ -3,6 +3,9 @@
 
 #include <utility>
 
+#include "ZinHost/Target.h"
+#include "ZinHost/TextError.h"
+
 namespace py = pybind11;
 
 namespace zinmox {
@@ -63,6 +66,11 @@ void bindErrors(py::module_& module) {
       std::rethrow_exception(pending);
     } catch (const Failure& failure) {
       raiseError(failure);
+    } catch (const ZinHost::TextError& error) {
+      PyErr_SetString(PyExc_ValueError, error.what());
+    } catch (const ZinHost::TargetError& error) {
+      const bool unreachable = error.kind() == ZinHost::TargetError::Kind::Unreachable;
+      PyErr_SetString(unreachable ? PyExc_ConnectionError : PyExc_ValueError, error.what());
     }
   });
 }

@@ -34,7 +34,9 @@ class Failure : public std::exception {
   std::string text_;
 };
 
-/// Creates zinmox.Error and the translation of Failure into it.
+/// Creates zinmox.Error and the translation of Failure into it, and translates the host
+/// library's errors: a malformed text into ValueError, an unreachable target server into
+/// ConnectionError.
 void bindErrors(pybind11::module_& module);
 
 /// Writes messages to the logger "zinmox" (GIL held): code 256 as errors, the abort code as

@@ -3,6 +3,7 @@
 
 #include <utility>
 
+#include "Gil.h"
 #include "ZinRT/ZinJtag.h"
 
 namespace py = pybind11;
@@ -80,26 +81,25 @@ void SessionState::logPending() {
 }
 
 void SessionState::close() {
-  {
-    py::gil_scoped_release unlocked;
+  const bool closed = withoutGil([this] {
     std::unique_lock<std::shared_mutex> guard(closeMutex_);
     const uint32_t handle = handle_.exchange(0);
-    if (handle == 0) return;
+    if (handle == 0) return false;
     ZinJtag_closeSession(handle);
-  }
-  logPending();
+    return true;
+  });
+  if (closed) logPending();
 }
 
 Messages SessionState::run(const std::function<void(uint32_t)>& work) {
   Messages messages;
-  {
-    py::gil_scoped_release unlocked;
+  withoutGil([&] {
     std::shared_lock<std::shared_mutex> guard(closeMutex_);
     const uint32_t handle = handle_.load();
     if (handle == 0) throw closedFailure();
     CaptureScope capture(handle, messages);
     work(handle);
-  }
+  });
   logPending();
   return messages;
 }

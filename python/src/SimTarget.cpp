@@ -10,6 +10,7 @@
 
 #include "Convert.h"
 #include "CoreRef.h"
+#include "Gil.h"
 #include "ZinSim/Target.h"
 
 namespace py = pybind11;
@@ -39,8 +40,35 @@ uint64_t toUint64(const py::handle& value, const std::string& what) {
   if (!py::isinstance<py::int_>(value) || py::isinstance<py::bool_>(value)) {
     throw py::type_error(what + " must be an int, not " + typeName(value));
   }
-  if (isNegative(value)) throw py::value_error(what + " must not be negative");
+  const int tooBig = PyObject_RichCompareBool(value.ptr(), py::int_(UINT64_MAX).ptr(), Py_GT);
+  if (tooBig < 0) throw py::error_already_set();
+  if (isNegative(value) || tooBig == 1) {
+    throw py::value_error(what + " must be 0 to 18446744073709551615, not " +
+                          std::string(py::str(value)));
+  }
   return value.cast<uint64_t>();
+}
+
+// Advances every MOX core, refusing a step that would carry a cycle count past 2**64-1 (the
+// counts would wrap and the cores' waveforms jump back to cycle 0).
+void advance(Target& target, uint64_t cycles) {
+  std::vector<ZIN_CORE_REF> refs;
+  target.listCores(refs);
+  for (const ZIN_CORE_REF& ref : refs) {
+    uint64_t now = 0;
+    try {
+      now = target.cycle(ref);
+    } catch (const std::invalid_argument&) {
+      continue;  // not a MOX core: it has no clock
+    }
+    if (cycles > UINT64_MAX - now) {
+      throw std::overflow_error("advancing " + std::to_string(cycles) +
+                                " cycles would carry the "
+                                "cycle count of core " +
+                                refText(ref) + " (" + std::to_string(now) + ") past 2**64-1");
+    }
+  }
+  target.advance(cycles);
 }
 
 // The keys of a source dict other than "kind" that its kind accepts.
@@ -121,7 +149,8 @@ std::string levelsText(const Target& target, const ZIN_CORE_REF& ref, const std:
 void bindSimTarget(py::module_& module) {
   using Ptr = std::shared_ptr<Target>;
   using py::arg;
-  const auto release = py::call_guard<py::gil_scoped_release>();
+  // The short calls below keep the GIL: they only take the target's mutex, which no holder
+  // keeps while waiting for the GIL. The long ones release it through withoutGil.
   py::class_<Target, Ptr>(module, "SimTarget",
                           "The simulated target behind a session (Session.target), for test "
                           "benches. Core references are tuples or \"D:C:I\" texts; ports are "
@@ -133,8 +162,7 @@ void bindSimTarget(py::module_& module) {
             const ZIN_CORE_REF core = toCoreRef(ref);
             const InputSource input = toSource(source);
             const ZinSim::InputPort which = inputPort(port);
-            py::gil_scoped_release unlocked;
-            target.setInputSource(core, which, bit, input);
+            withoutGil([&] { target.setInputSource(core, which, bit, input); });
           },
           arg("ref"), arg("port"), arg("bit"), arg("source"),
           "Rewires one input bit. source: 0 or 1 (a constant level) or a dict as in a target "
@@ -142,19 +170,22 @@ void bindSimTarget(py::module_& module) {
           "\"output\": \"async\", \"bit\": 3}, {\"kind\": \"counter\", \"bit\": 0} or "
           "{\"kind\": \"square\", \"period\": 8, \"phase\": 0}. A changed level counts as "
           "activity. ValueError for a bit or a source the core does not have.")
-      .def("advance", &Target::advance, arg("cycles"), release,
-           "Lets `cycles` clock cycles pass on every MOX core.")
-      .def("set_cycles_per_sequence", &Target::setCyclesPerSequence, arg("cycles"), release,
+      .def(
+          "advance",
+          [](Target& target, const py::handle& cycles) {
+            const uint64_t count = toUint64(cycles, "cycles");
+            withoutGil([&] { advance(target, count); });
+          },
+          arg("cycles"),
+          "Lets `cycles` clock cycles pass on every MOX core. OverflowError when a core's cycle "
+          "count would pass 2**64-1.")
+      .def("set_cycles_per_sequence", &Target::setCyclesPerSequence, arg("cycles"),
            "Sets the cycles that pass with each command sequence, for every MOX core.")
       .def(
           "levels",
           [](const Target& target, const py::handle& ref, const std::string& port) {
             const ZIN_CORE_REF core = toCoreRef(ref);
-            std::string text;
-            {
-              py::gil_scoped_release unlocked;
-              text = levelsText(target, core, port);
-            }
+            const std::string text = withoutGil([&] { return levelsText(target, core, port); });
             return levelsNumber(text);
           },
           arg("ref"), arg("port"),
@@ -165,25 +196,24 @@ void bindSimTarget(py::module_& module) {
           "cycle",
           [](const Target& target, const py::handle& ref) {
             const ZIN_CORE_REF core = toCoreRef(ref);
-            py::gil_scoped_release unlocked;
-            return target.cycle(core);
+            return withoutGil([&] { return target.cycle(core); });
           },
           arg("ref"), "The clock cycle count of a core.")
-      .def("command_log", &Target::commandLog, release,
+      .def("command_log", &Target::commandLog,
            "The texts of the latest command sequences received, oldest first.")
-      .def("clear_command_log", &Target::clearCommandLog, release)
+      .def("clear_command_log", &Target::clearCommandLog)
       .def_property_readonly("flush_count", &Target::flushCount, "Flushes received.")
       .def(
           "fail_next_transfer",
           [](Target& target, const std::string& message) { target.failNextTransfer(message); },
-          arg("message"), release,
+          arg("message"),
           "The next command sequence fails with `message` instead of taking effect.")
       .def(
           "fail_next_status_read",
           [](Target& target, const std::string& message) {
             target.failNextStatusRead(std::make_exception_ptr(std::runtime_error(message)));
           },
-          arg("message"), release, "The next status read fails with `message`.");
+          arg("message"), "The next status read fails with `message`.");
 }
 
 }  // namespace zinmox

@@ -1,27 +1,19 @@
-// What a Session talks to: the one place where the `target` argument becomes a transport.
+// What a Session talks to: the `target` argument becomes a target of the host library.
 #ifndef ZINMOX_PYTHON_TRANSPORT_H
 #define ZINMOX_PYTHON_TRANSPORT_H
 
 #include <pybind11/pybind11.h>
 
-#include <memory>
-#include <string>
-
-#include "ZinRT/Zin_Transport.h"
-#include "ZinSim/Target.h"
+#include "ZinHost/Target.h"
 
 namespace zinmox {
 
-struct TransportChoice {
-  std::shared_ptr<ZinRT::Zin_Transport> transport;
-  std::shared_ptr<ZinSim::Target> simulated;  // set when the transport is a simulated target
-  std::string description;                    // for repr()
-};
+using TransportChoice = ZinHost::OpenedTarget;
 
-/// None: the built-in demo design; "tcp://HOST:PORT": a target server (ConnectionError when it
-/// cannot be reached); a str or path-like: a description file; a dict: a description
-/// in the description format. Raises TypeError for other types and ValueError for an unusable
-/// description (its text names the place of the problem).
+/// None: the built-in demo design; a str or path-like: a target text of the host library
+/// ("tcp://HOST:PORT" or a description file); a dict: a description in the description format.
+/// Raises TypeError for other types; ZinHost::TargetError becomes ValueError, or ConnectionError
+/// for a server that cannot be reached.
 TransportChoice makeTransport(const pybind11::object& target);
 
 }  // namespace zinmox

@@ -8,7 +8,7 @@
 #include <vector>
 
 #include "Convert.h"
-#include "HexText.h"
+#include "ZinHost/ValueText.h"
 
 namespace py = pybind11;
 
@@ -17,6 +17,17 @@ namespace zinmox {
 namespace {
 
 constexpr size_t kSteps = 16;
+
+// `digits` hex digits of the little-endian number in `bytes`.
+std::string hexText(const std::string& bytes, size_t digits) {
+  const auto* data = reinterpret_cast<const uint8_t*>(bytes.data());
+  return ZinHost::packedToHex({data, bytes.size()}, 4 * static_cast<uint64_t>(digits));
+}
+
+// A value text after the clients' "0x" rule (ValueError otherwise).
+std::string valueDigits(const py::handle& text, const std::string& what) {
+  return ZinHost::hexDigits(text.cast<std::string>(), what);
+}
 constexpr const char* kPulseTrain = "pulsetrain";
 
 enum class Kind { Text, Number, Steps };
@@ -49,6 +60,7 @@ Entry makeEntry(const py::handle& key, const py::handle& value) {
   entry.suffix = dot == std::string::npos ? std::string() : entry.key.substr(dot + 1);
   if (py::isinstance<py::str>(value)) {
     toCText(value, "the value of \"" + entry.key + "\"");  // the library reads it up to a NUL
+    entry.value = py::str(valueDigits(value, "the value of " + entry.key));
     return entry;
   }
   if (py::isinstance<py::int_>(value)) {  // True and False write 1 and 0
@@ -104,11 +116,9 @@ std::string numberBytes(const py::object& value, uint64_t bits, size_t bytes,
 
 std::string stepBytes(const py::handle& step, const Width& width, const std::string& key) {
   if (py::isinstance<py::str>(step)) {
-    try {
-      return fitHexText(step.cast<std::string>(), width.bytes);
-    } catch (const std::invalid_argument& error) {
-      throw py::value_error(std::string(error.what()) + " (a step of \"" + key + "\")");
-    }
+    const std::vector<uint8_t> block =
+        ZinHost::fitHexDigits(valueDigits(step, "a step of " + key), width.bytes);
+    return std::string(block.begin(), block.end());
   }
   if (!py::isinstance<py::int_>(step)) {
     throw py::type_error("the steps of \"" + key + "\" must be ints or hex str, not " +

@@ -49,8 +49,14 @@ void Zin_CoreComm::commandSequence(uint32_t handle, const std::string& text,
   }
   const uint32_t readBytes = readBitCount / 8 + (readBitCount % 8 != 0 ? 1 : 0);
   if (readBytes != 0) std::memset(readData, 0, readBytes);
-  ZinJtag_session_withTransport(handle, [&](Zin_Transport& transport) {
-    transport.commandSequence(text, readBitCount != 0 ? readData : nullptr, readBitCount);
+  // The work captures one pointer, so that the std::function holds it without allocating.
+  struct Transfer {
+    const std::string& text;
+    unsigned char* readData;
+    uint32_t readBitCount;
+  } transfer{text, readBitCount != 0 ? readData : nullptr, readBitCount};
+  ZinJtag_session_withTransport(handle, [t = &transfer](Zin_Transport& transport) {
+    transport.commandSequence(t->text, t->readData, t->readBitCount);
   });
   if (progress != nullptr) {
     const uint32_t lines = lineCount(text);

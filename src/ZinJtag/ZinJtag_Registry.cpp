@@ -1,6 +1,7 @@
 // The registry of open sessions: opening, closing, lookup and the close hooks.
 #include <algorithm>
 #include <exception>
+#include <limits>
 #include <map>
 #include <stdexcept>
 #include <string>
@@ -59,6 +60,13 @@ void ZinJtag_closeSession(uint32_t handle) {
   if (session->closing.exchange(true)) {
     throw std::invalid_argument("ZinJtag_closeSession: session " + std::to_string(handle) +
                                 " is already being closed");
+  }
+  // The close waits for the call in progress to leave the target lock, and calls that wait for
+  // the lock after it fail instead of finding destroyed cores.
+  ZinJtagTargetLock lock(handle, std::numeric_limits<uint32_t>::max());
+  {
+    std::lock_guard<std::mutex> guard(session->lockMutex);
+    session->closed = true;
   }
   Registry& r = registry();
   std::vector<void (*)(uint32_t)> hooks;

@@ -32,6 +32,7 @@ struct ZinJtagSessionState {
   std::thread::id owner;
   uint32_t depth = 0;
   uint64_t lockCount = 0;
+  bool closed = false;  // set by close while it holds the lock; later lockers fail
 
   std::atomic<bool> closing{false};
 };

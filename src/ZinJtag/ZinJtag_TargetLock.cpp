@@ -16,7 +16,11 @@ ZinJtagTargetLock::ZinJtagTargetLock(uint32_t handle, uint32_t timeoutMs)
     return;
   }
   const bool free = s.lockReleased.wait_for(guard, std::chrono::milliseconds(timeoutMs),
-                                            [&s] { return s.depth == 0; });
+                                            [&s] { return s.depth == 0 || s.closed; });
+  if (s.closed) {
+    throw std::runtime_error("ZinJtag: session " + std::to_string(handle) +
+                             " was closed while the call waited for its target lock");
+  }
   if (!free) {
     throw std::runtime_error("ZinJtag: target lock of session " + std::to_string(handle) +
                              " not obtained within " + std::to_string(timeoutMs) + " ms");
@@ -31,7 +35,12 @@ ZinJtagTargetLock::~ZinJtagTargetLock() {
   std::lock_guard<std::mutex> guard(s.lockMutex);
   if (--s.depth == 0) {
     s.owner = std::thread::id();
-    s.lockReleased.notify_one();
+    // After a close every waiter must learn of it, not only the next one.
+    if (s.closed) {
+      s.lockReleased.notify_all();
+    } else {
+      s.lockReleased.notify_one();
+    }
   }
 }
 

@@ -1,6 +1,7 @@
 // The server: listener, accept loop, I/O thread, request thread, signals and shutdown.
 #include "ZinNet/Server.h"
 
+#include <algorithm>
 #include <condition_variable>
 #include <csignal>
 #include <optional>
@@ -9,7 +10,7 @@
 
 #include "Asio.h"
 #include "ServerConnection.h"
-#include "ServerCore.h"
+#include "ServerState.h"
 
 namespace ZinNet {
 
@@ -17,16 +18,17 @@ using asio::ip::tcp;
 
 struct Server::Impl {
   Impl(std::shared_ptr<ZinRT::Zin_Transport> transport, ServerOptions options)
-      : core(std::make_shared<ServerCore>(std::move(transport), std::move(options))) {}
+      : state(std::make_shared<ServerState>(std::move(transport), std::move(options))) {}
 
   void listen();
   void accept();
   void onAccepted(std::error_code ec, tcp::socket socket);
+  bool makeRoom();
   void watchSignals();
   void ioMain();
 
-  std::shared_ptr<ServerCore> core;
-  // Declared after the core: the I/O objects go first, and with them every connection.
+  std::shared_ptr<ServerState> state;
+  // Declared after the state: the I/O objects go first, and with them every connection.
   asio::io_context io;
   asio::thread_pool requests{1};  // carries out the requests, one at a time, in arrival order
   std::optional<tcp::acceptor> acceptor;
@@ -35,7 +37,7 @@ struct Server::Impl {
   std::thread ioThread;
   tcp::endpoint bound;
   uint64_t nextId = 1;
-  std::vector<std::weak_ptr<ServerConnection>> connections;  // I/O thread, then stop()
+  std::vector<std::weak_ptr<ServerConnection>> connections;
 
   mutable std::mutex stateMutex;
   std::condition_variable stoppedChanged;
@@ -45,7 +47,7 @@ struct Server::Impl {
 };
 
 void Server::Impl::listen() {
-  const ServerOptions& options = core->options;
+  const ServerOptions& options = state->options;
   std::error_code ec;
   tcp::resolver resolver(io);
   const auto results =
@@ -64,9 +66,9 @@ void Server::Impl::listen() {
   if (!ec) bound = acceptor->local_endpoint(ec);
   if (ec) throw std::runtime_error("ZinNet: cannot listen on " + where + ": " + ec.message());
   const bool loopback = bound.address().is_loopback();
-  core->log("listening on " + bound.address().to_string() + ":" + std::to_string(bound.port()) +
-            (loopback ? " (loopback only: other machines cannot connect)"
-                      : " (open to other machines: whoever reaches this port drives the target)"));
+  state->log("listening on " + bound.address().to_string() + ":" + std::to_string(bound.port()) +
+             (loopback ? " (loopback only: other machines cannot connect)"
+                       : " (open to other machines: whoever reaches this port drives the target)"));
 }
 
 void Server::Impl::accept() {
@@ -79,20 +81,25 @@ void Server::Impl::onAccepted(std::error_code ec, tcp::socket socket) {
   if (ec == asio::error::operation_aborted || !acceptor->is_open()) return;
   if (ec) {
     // Out of descriptors or a similar passing fault: try again a little later.
-    core->log("accept failed: " + ec.message());
+    state->log("accept failed: " + ec.message());
     retry.emplace(io, std::chrono::milliseconds(100));
     retry->async_wait([this](std::error_code e) {
       if (!e) accept();
     });
     return;
   }
-  ++core->connectionsAccepted;
-  auto connection = std::make_shared<ServerConnection>(core, std::move(socket),
+  ++state->connectionsAccepted;
+  auto connection = std::make_shared<ServerConnection>(state, std::move(socket),
                                                        requests.get_executor(), nextId++);
   std::erase_if(connections, [](const auto& weak) { return weak.expired(); });
+  const auto placesTaken = std::count_if(connections.begin(), connections.end(), [](auto& weak) {
+    const auto c = weak.lock();
+    return c && c->holdsPlace();
+  });
+  const bool full = static_cast<uint64_t>(placesTaken) >= state->options.maxClients && !makeRoom();
   connections.push_back(connection);
-  if (core->connectionsOpen > core->options.maxClients) {
-    connection->refuseAndClose("the server is busy: " + std::to_string(core->options.maxClients) +
+  if (full) {
+    connection->refuseAndClose("the server is busy: " + std::to_string(state->options.maxClients) +
                                " clients are connected");
   } else {
     connection->start();
@@ -100,12 +107,30 @@ void Server::Impl::onAccepted(std::error_code ec, tcp::socket socket) {
   accept();
 }
 
+// Closes the connection that has waited longest for its next request, if any connection is
+// between requests; connections whose request is in progress keep their place.
+bool Server::Impl::makeRoom() {
+  std::shared_ptr<ServerConnection> oldest;
+  std::chrono::steady_clock::time_point oldestSince{};
+  for (const auto& weak : connections) {
+    std::chrono::steady_clock::time_point since{};
+    const auto c = weak.lock();
+    if (c && c->evictable(since) && (!oldest || since < oldestSince)) {
+      oldest = c;
+      oldestSince = since;
+    }
+  }
+  if (!oldest) return false;
+  oldest->close("closed to make room for a new client: it had waited longest for a request");
+  return true;
+}
+
 void Server::Impl::watchSignals() {
   signals.emplace(io, SIGINT, SIGTERM);
   signals->async_wait([this](std::error_code ec, int number) {
     if (ec) return;
-    core->log(std::string("stopping on ") + (number == SIGINT ? "SIGINT" : "SIGTERM"));
-    core->stopping = true;
+    state->log(std::string("stopping on ") + (number == SIGINT ? "SIGINT" : "SIGTERM"));
+    state->stopping = true;
     io.stop();
   });
 }
@@ -114,9 +139,9 @@ void Server::Impl::ioMain() {
   try {
     io.run();
   } catch (const std::exception& e) {
-    core->log(std::string("stopped by an error: ") + e.what());
+    state->log(std::string("stopped by an error: ") + e.what());
   }
-  core->stopping = true;
+  state->stopping = true;
   std::lock_guard<std::mutex> lock(stateMutex);
   ioDone = true;
   stoppedChanged.notify_all();
@@ -144,7 +169,7 @@ void Server::start() {
     impl_->started = false;
     throw;
   }
-  if (impl_->core->options.stopOnSignals) impl_->watchSignals();
+  if (impl_->state->options.stopOnSignals) impl_->watchSignals();
   impl_->accept();
   impl_->ioThread = std::thread([impl = impl_.get()] { impl->ioMain(); });
 }
@@ -155,10 +180,11 @@ void Server::stop() {
     if (!impl_->started || impl_->joined) return;
     impl_->joined = true;
   }
-  impl_->core->stopping = true;
+  impl_->state->stopping = true;
   impl_->io.stop();
   if (impl_->ioThread.joinable()) impl_->ioThread.join();
   impl_->requests.join();  // a request in progress finishes; the queued ones are skipped
+  impl_->state->waiting.clear();
   // The I/O thread is gone: close what it left open, so clients see the end at once.
   std::error_code ec;
   if (impl_->acceptor) impl_->acceptor->close(ec);
@@ -166,7 +192,7 @@ void Server::stop() {
     if (auto connection = weak.lock()) connection->close("the server stopped");
   }
   impl_->connections.clear();
-  impl_->core->log("stopped");
+  impl_->state->log("stopped");
 }
 
 void Server::wait() {
@@ -188,12 +214,12 @@ std::string Server::address() const {
 }
 
 ServerStats Server::stats() const {
-  return impl_->core->snapshot();
+  return impl_->state->snapshot();
 }
 
 void Server::withTransport(const std::function<void(ZinRT::Zin_Transport&)>& work) {
-  std::lock_guard<std::mutex> lock(impl_->core->requestMutex);
-  work(*impl_->core->transport);
+  std::lock_guard<std::mutex> lock(impl_->state->requestMutex);
+  work(*impl_->state->transport);
 }
 
 }  // namespace ZinNet

@@ -2,6 +2,7 @@
 #include "ServerConnection.h"
 
 #include <cstring>
+#include <utility>
 
 #include "RequestHandler.h"
 
@@ -9,9 +10,9 @@ namespace ZinNet {
 
 using Protocol::MessageType;
 
-ServerConnection::ServerConnection(std::shared_ptr<ServerCore> core, asio::ip::tcp::socket socket,
+ServerConnection::ServerConnection(std::shared_ptr<ServerState> state, asio::ip::tcp::socket socket,
                                    asio::any_io_executor requests, uint64_t id)
-    : core_(std::move(core)),
+    : state_(std::move(state)),
       socket_(std::move(socket)),
       timer_(socket_.get_executor()),
       requests_(std::move(requests)),
@@ -21,16 +22,22 @@ ServerConnection::ServerConnection(std::shared_ptr<ServerCore> core, asio::ip::t
   peer_ = ec ? std::string("an unknown peer")
              : remote.address().to_string() + ":" + std::to_string(remote.port());
   socket_.set_option(asio::ip::tcp::no_delay(true), ec);
-  ++core_->connectionsOpen;
+  ++state_->connectionsOpen;
 }
 
 ServerConnection::~ServerConnection() {
-  --core_->connectionsOpen;
+  --state_->connectionsOpen;
 }
 
 void ServerConnection::start() {
-  core_->log("connection " + std::to_string(id_) + " from " + peer_ + " opened");
+  state_->log("connection " + std::to_string(id_) + " from " + peer_ + " opened");
+  armTimer(state_->options.greetingTimeoutMs, "the greeting");
   readPrefix();
+}
+
+bool ServerConnection::evictable(std::chrono::steady_clock::time_point& since) const {
+  since = lastExchange_;
+  return holdsPlace() && !inExchange_;
 }
 
 void ServerConnection::close(const std::string& why) {
@@ -40,18 +47,20 @@ void ServerConnection::close(const std::string& why) {
   timer_.cancel();
   socket_.shutdown(asio::ip::tcp::socket::shutdown_both, ec);
   socket_.close(ec);
-  core_->log("connection " + std::to_string(id_) + " closed after " +
-             std::to_string(requestCount_) + " requests: " + why);
+  state_->log("connection " + std::to_string(id_) + " closed after " +
+              std::to_string(requestCount_) + " requests: " + why);
 }
 
 void ServerConnection::refuseAndClose(const std::string& why) {
-  core_->log("connection from " + peer_ + " refused: " + why);
+  leaving_ = true;
+  state_->log("connection from " + peer_ + " refused: " + why);
   send(textFrame(MessageType::Closing, why), true);
 }
 
 void ServerConnection::refuse(const std::string& why, bool thenClose) {
-  ++core_->framesRefused;
-  core_->log("connection " + std::to_string(id_) + ": " + why);
+  ++state_->framesRefused;
+  state_->log("connection " + std::to_string(id_) + ": " + why);
+  leaving_ = leaving_ || thenClose;
   send(textFrame(thenClose ? MessageType::Closing : MessageType::Refused, why), thenClose);
 }
 
@@ -62,7 +71,7 @@ void ServerConnection::armTimer(uint32_t ms, const char* what) {
   timer_.expires_after(std::chrono::milliseconds(ms));
   timer_.async_wait([self = shared_from_this(), generation, ms, what](std::error_code ec) {
     if (ec || generation != self->timerGeneration_ || self->closed_) return;
-    ++self->core_->framesRefused;
+    ++self->state_->framesRefused;
     self->close(std::string(what) + " not done within " + std::to_string(ms) + " ms");
   });
 }
@@ -79,7 +88,7 @@ void ServerConnection::onReadError(std::error_code ec, const char* where) {
     close("the client closed the connection");
     return;
   }
-  ++core_->framesRefused;  // a truncated frame
+  ++state_->framesRefused;  // a truncated frame
   if (ended) {
     close(std::string("the client closed the connection ") + where);
   } else {
@@ -89,7 +98,10 @@ void ServerConnection::onReadError(std::error_code ec, const char* where) {
 
 void ServerConnection::readPrefix() {
   if (closed_) return;
-  if (prefixBytes_ == 0) armTimer(core_->options.idleTimeoutMs, "waiting for a frame");
+  // Before the hello, the greeting timer armed at the start runs on.
+  if (prefixBytes_ == 0 && greeted_) {
+    armTimer(state_->options.idleTimeoutMs, "waiting for a frame");
+  }
   socket_.async_read_some(
       asio::buffer(prefix_.data() + prefixBytes_, prefix_.size() - prefixBytes_),
       [self = shared_from_this()](std::error_code ec, size_t n) { self->onPrefix(ec, n); });
@@ -100,7 +112,9 @@ void ServerConnection::onPrefix(std::error_code ec, size_t n) {
     onReadError(ec, prefixBytes_ == 0 ? "between frames" : "inside a frame's length");
     return;
   }
-  if (prefixBytes_ == 0 && n != 0) armTimer(core_->options.frameTimeoutMs, "a frame");
+  if (prefixBytes_ == 0 && n != 0 && greeted_) {
+    armTimer(state_->options.frameTimeoutMs, "a frame");
+  }
   prefixBytes_ += n;
   if (prefixBytes_ < prefix_.size()) {
     readPrefix();
@@ -110,9 +124,9 @@ void ServerConnection::onPrefix(std::error_code ec, size_t n) {
   const uint32_t length = decodeLength(prefix_.data());
   if (length == 0) {
     refuse("frame of length 0", true);
-  } else if (length > core_->options.maxFrameBytes) {
+  } else if (length > state_->options.maxFrameBytes) {
     refuse("frame of " + std::to_string(length) + " bytes exceeds the limit of " +
-               std::to_string(core_->options.maxFrameBytes) + " bytes",
+               std::to_string(state_->options.maxFrameBytes) + " bytes",
            true);
   } else {
     readBody(length);
@@ -127,10 +141,12 @@ void ServerConnection::readBody(uint32_t length) {
                        self->onReadError(ec, "inside a frame");
                        return;
                      }
+                     // The body moves on without a copy, and the buffer keeps no memory between
+                     // frames.
                      Frame frame;
                      frame.type = static_cast<MessageType>(self->body_.front());
-                     frame.body.assign(self->body_.begin() + 1, self->body_.end());
-                     self->body_.clear();
+                     self->body_.erase(self->body_.begin());
+                     frame.body = std::exchange(self->body_, {});
                      self->onFrame(std::move(frame));
                    });
 }
@@ -138,6 +154,7 @@ void ServerConnection::readBody(uint32_t length) {
 void ServerConnection::onFrame(Frame frame) {
   if (closed_) return;
   disarmTimer();
+  inExchange_ = true;
   if (!greeted_) {
     onHello(frame);
   } else if (frame.type == MessageType::Hello) {
@@ -169,32 +186,37 @@ void ServerConnection::onHello(const Frame& frame) {
   greeted_ = true;
   FrameWriter out(MessageType::Welcome);
   out.bytes(Protocol::kMagic, 4).u16(Protocol::kVersion);
-  out.u32(core_->options.maxFrameBytes).u32(core_->options.maxReadBytes);
-  send(out.text(boundedText(core_->options.name)).finish(), false);
+  out.u32(state_->options.maxFrameBytes).u32(state_->options.maxReadBytes);
+  send(out.text(boundedText(state_->options.name)).finish(), false);
 }
 
 void ServerConnection::runRequest(Frame frame) {
   // The request runs on the request executor; the reply comes back to the I/O thread.
+  // Each post takes one request from the queue, the small ones first.
   const MessageType type = frame.type;
-  asio::post(requests_, [self = shared_from_this(), type, frame = std::move(frame)]() {
-    if (self->core_->stopping) return;
+  const size_t bodyBytes = frame.body.size();
+  state_->waiting.push(bodyBytes, [self = shared_from_this(), type, frame = std::move(frame)]() {
+    if (self->state_->stopping) return;
     Reply reply;
     {
-      std::lock_guard<std::mutex> lock(self->core_->requestMutex);
-      reply = carryOut(frame, *self->core_->transport, self->core_->options.maxReadBytes);
+      std::lock_guard<std::mutex> lock(self->state_->requestMutex);
+      reply = carryOut(frame, *self->state_->transport, self->state_->options.maxReadBytes);
     }
     asio::post(self->socket_.get_executor(), [self, type, reply = std::move(reply)]() mutable {
       if (reply.carriedOut) {
-        ++self->core_->requestsServed;
+        ++self->state_->requestsServed;
         ++self->requestCount_;
       }
       if (reply.refused) {
-        ++self->core_->framesRefused;
-        self->core_->log("connection " + std::to_string(self->id_) + ": refused a malformed " +
-                         typeText(static_cast<uint8_t>(type)) + " request");
+        ++self->state_->framesRefused;
+        self->state_->log("connection " + std::to_string(self->id_) + ": refused a malformed " +
+                          typeText(static_cast<uint8_t>(type)) + " request");
       }
       self->send(std::move(reply.bytes), false);
     });
+  });
+  asio::post(requests_, [state = state_]() {
+    if (auto job = state->waiting.pop()) job();
   });
 }
 
@@ -226,16 +248,19 @@ void ServerConnection::drain() {
 void ServerConnection::send(std::vector<unsigned char> bytes, bool thenClose) {
   if (closed_) return;
   outgoing_ = std::move(bytes);
-  armTimer(core_->options.writeTimeoutMs, "sending a reply");
+  armTimer(state_->options.writeTimeoutMs, "sending a reply");
   asio::async_write(socket_, asio::buffer(outgoing_),
                     [self = shared_from_this(), thenClose](std::error_code ec, size_t) {
                       if (self->closed_) return;
                       self->disarmTimer();
+                      self->outgoing_ = {};  // no reply is kept between requests
                       if (ec) {
                         self->close("write failed: " + ec.message());
                       } else if (thenClose) {
                         self->lingerAndClose();
                       } else {
+                        self->inExchange_ = false;
+                        self->lastExchange_ = std::chrono::steady_clock::now();
                         self->readPrefix();
                       }
                     });

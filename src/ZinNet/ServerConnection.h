@@ -3,6 +3,7 @@
 #define ZINNET_SRC_SERVERCONNECTION_H
 
 #include <array>
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -10,16 +11,16 @@
 
 #include "Asio.h"
 #include "Frame.h"
-#include "ServerCore.h"
+#include "ServerState.h"
 
 namespace ZinNet {
 
 /// Lives on the server's I/O thread; the requests themselves run on the request executor, one at
-/// a time under the core's request mutex. A connection reads its next frame only after the reply
+/// a time under the server's request mutex. A connection reads its next frame only after the reply
 /// to the previous one is written, so a client cannot queue up work on the server.
 class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
  public:
-  ServerConnection(std::shared_ptr<ServerCore> core, asio::ip::tcp::socket socket,
+  ServerConnection(std::shared_ptr<ServerState> state, asio::ip::tcp::socket socket,
                    asio::any_io_executor requests, uint64_t id);
   ~ServerConnection();
 
@@ -29,6 +30,11 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   void refuseAndClose(const std::string& why);
   /// Closes the socket now.
   void close(const std::string& why);
+  /// Whether the connection holds a place: open and not on its way out.
+  bool holdsPlace() const { return !closed_ && !leaving_; }
+  /// Whether it may be closed to make room: no request of it is queued, carried out or being
+  /// answered. `since` is when it last completed an exchange (or connected).
+  bool evictable(std::chrono::steady_clock::time_point& since) const;
 
  private:
   void readPrefix();
@@ -45,7 +51,7 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   void disarmTimer();
   void onReadError(std::error_code ec, const char* where);
 
-  std::shared_ptr<ServerCore> core_;
+  std::shared_ptr<ServerState> state_;
   asio::ip::tcp::socket socket_;
   asio::steady_timer timer_;
   asio::any_io_executor requests_;
@@ -60,6 +66,9 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   static constexpr uint32_t kLingerMs = 1000;
   bool greeted_ = false;
   bool closed_ = false;
+  bool leaving_ = false;     // a closing frame is being sent
+  bool inExchange_ = false;  // a request is queued, carried out or answered
+  std::chrono::steady_clock::time_point lastExchange_ = std::chrono::steady_clock::now();
   uint64_t requestCount_ = 0;
 };
 

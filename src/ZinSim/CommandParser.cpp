@@ -1,7 +1,9 @@
 // Reads and checks a command sequence against the cores it addresses.
 #include "CommandParser.h"
 
+#include <algorithm>
 #include <cstdio>
+#include <map>
 #include <stdexcept>
 #include <string>
 
@@ -108,14 +110,22 @@ class LineParser {
     }
   }
 
+  // Checked without storing anything, and refused by its digit count first: a short text must
+  // not stand for a long number.
   static void readData(std::string_view data, CommandLine& cmd) {
     if (cmd.code == kWrite) {
-      const std::string problem = parseHexNumber(data, cmd.bitLength - 1, &cmd.data);
+      const uint64_t digits = std::max<uint64_t>(1, (uint64_t{cmd.bitLength} + 2) / 4);
+      if (data.size() != digits) {
+        throw std::invalid_argument("data has " + std::to_string(data.size()) +
+                                    " digits; bit length " + hex8(cmd.bitLength) + " needs " +
+                                    std::to_string(digits));
+      }
+      const std::string problem = parseHexNumber(data, cmd.bitLength - 1, nullptr);
       if (!problem.empty()) throw std::invalid_argument(problem);
+      cmd.data = data;
       return;
     }
-    const std::string problem = parseHexNumber(data, 0, nullptr);
-    if (!problem.empty()) {
+    if (data != "0") {
       throw std::invalid_argument("data must be 0 for code 0" + std::to_string(cmd.code) +
                                   ", found \"" + std::string(data.substr(0, 40)) + "\"");
     }
@@ -125,10 +135,38 @@ class LineParser {
   CoreMap& cores_;
 };
 
+// Adds up the work of a sequence line by line. A 02 line commits a new image only when it is the
+// first of its core in the sequence or a 01 line to that core came before it; the others change
+// nothing and cost one.
+class WorkCount {
+ public:
+  void add(const CommandLine& line) {
+    uint64_t work = 1;
+    if (line.code == kWrite || line.code == kRead) work += line.bitLength;
+    if (line.code == kWrite) staged_[line.core] = true;
+    if (line.code == kCommit) {
+      const auto [it, first] = staged_.try_emplace(line.core, false);
+      if (first || it->second) work += line.core->portBits();
+      it->second = false;
+    }
+    total_ += work;
+    if (total_ > kMaxSequenceWork) {
+      throw std::invalid_argument("the sequence exceeds the work limit of " +
+                                  std::to_string(kMaxSequenceWork) + " bit operations");
+    }
+  }
+
+ private:
+  std::map<const MoxModel*, bool> staged_;  // a 01 line since the last 02, per core
+  uint64_t total_ = 0;
+};
+
 }  // namespace
 
 std::vector<CommandLine> parseCommandSequence(std::string_view text, CoreMap& cores) {
   std::vector<CommandLine> lines;
+  lines.reserve(static_cast<size_t>(std::count(text.begin(), text.end(), '\n')) + 1);
+  WorkCount work;
   size_t start = 0;
   for (size_t number = 1;; ++number) {
     const size_t end = text.find('\n', start);
@@ -136,6 +174,7 @@ std::vector<CommandLine> parseCommandSequence(std::string_view text, CoreMap& co
         text.substr(start, end == std::string_view::npos ? end : end - start);
     try {
       lines.push_back(LineParser(line, cores).parse());
+      work.add(lines.back());
     } catch (const std::invalid_argument& e) {
       throw std::runtime_error("ZinSim: command line " + std::to_string(number) + ": " + e.what());
     }

@@ -12,6 +12,8 @@ namespace ZinSim {
 inline constexpr uint32_t kMaxCounterBit = 62;
 /// Largest square-wave period (so that every phase arithmetic stays in 64 bits).
 inline constexpr uint64_t kMaxSquarePeriod = uint64_t{1} << 62;
+// Arrays and objects nested in a description text, at most.
+inline constexpr int kMaxDescriptionDepth = 32;
 
 /// The first problem of one core, with its place relative to the core ("async_inputs",
 /// "wiring/1/source/bit"), or nothing.

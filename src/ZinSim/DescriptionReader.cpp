@@ -23,6 +23,14 @@ const char* typeName(const json& j) {
   return j.type_name();
 }
 
+// A value as JSON text for a message, cut to its first kEchoChars characters.
+std::string echo(const json& j) {
+  constexpr size_t kEchoChars = 64;
+  std::string text = j.dump();
+  if (text.size() > kEchoChars) text.resize(kEchoChars), text += "...";
+  return text;
+}
+
 void requireObject(const json& j, const std::string& at) {
   if (!j.is_object()) fail(at, std::string("expected an object, found ") + typeName(j));
 }
@@ -45,18 +53,18 @@ uint64_t readUInt(const json& j, const std::string& at, uint64_t most) {
   uint64_t value = 0;
   if (j.is_number_unsigned()) {
     value = j.get<uint64_t>();
-  } else if (j.is_number_integer()) {
-    fail(at, "expected a number from 0 to " + std::to_string(most) + ", found " + j.dump());
+  } else if (j.is_number()) {  // negative, fractional, or beyond 64 bits
+    fail(at, "expected a number from 0 to " + std::to_string(most) + ", found " + echo(j));
   } else if (j.is_string() && j.get<std::string>().rfind("0x", 0) == 0 &&
              j.get<std::string>().size() > 2 && j.get<std::string>().size() <= 18) {
     const std::string text = j.get<std::string>().substr(2);
     if (text.find_first_not_of("0123456789abcdefABCDEF") != std::string::npos) {
-      fail(at, "expected a number, found the text " + j.dump());
+      fail(at, "expected a number, found the text " + echo(j));
     }
     value = std::stoull(text, nullptr, 16);
   } else {
     std::string found = std::string("expected a number, found ") + typeName(j);
-    if (j.is_string()) found.append(" ").append(j.dump());
+    if (j.is_string()) found.append(" ").append(echo(j));
     fail(at, found);
   }
   if (value > most) {
@@ -99,7 +107,7 @@ size_t readChoice(const json& object, const char* key, const std::string& at,
       ++index;
     }
   }
-  fail(at + "/" + key, "expected " + expected + ", found " + it->dump());
+  fail(at + "/" + key, "expected " + expected + ", found " + echo(*it));
 }
 
 InputSource readSource(const json& j, const std::string& at) {
@@ -285,9 +293,17 @@ TargetDescription readTarget(const json& j) {
 }  // namespace
 
 TargetDescription parseDescription(std::string_view jsonText) {
+  // Deeper than any description needs (about 10 levels); bounds the recursion of everything
+  // that later walks the document.
+  const json::parser_callback_t depthLimit = [](int depth, json::parse_event_t, json&) {
+    if (depth > kMaxDescriptionDepth) {
+      fail("", "nested deeper than " + std::to_string(kMaxDescriptionDepth) + " levels");
+    }
+    return true;
+  };
   json document;
   try {
-    document = json::parse(jsonText.begin(), jsonText.end());
+    document = json::parse(jsonText.begin(), jsonText.end(), depthLimit);
   } catch (const json::exception& e) {  // also a number too large for any type (out_of_range)
     fail("", std::string("not valid JSON: ") + e.what());
   }

@@ -50,6 +50,10 @@ uint32_t MoxModel::readLength() const {
   return static_cast<uint32_t>(4 * asyncIn_.size() + 6 * syncIn_.size() + 16);
 }
 
+uint64_t MoxModel::portBits() const {
+  return uint64_t{asyncOutCount_} + syncOutCount_ + asyncIn_.size() + syncIn_.size();
+}
+
 uint32_t MoxModel::width(InputPort port) const {
   return static_cast<uint32_t>(port == InputPort::Async ? asyncIn_.size() : syncIn_.size());
 }
@@ -64,6 +68,7 @@ void MoxModel::stage(const std::vector<uint8_t>& number) {
   const uint64_t a = asyncOutCount_;
   const uint64_t s = syncOutCount_;
   const uint64_t top = writeLength() - 2;  // number bit of D[0]
+  stagedSinceCommit_ = true;
   for (uint64_t i = 0; i < a; ++i) {
     stagedAsyncValue_[i] = numberBit(number, top - i);
     stagedAsyncUpdate_[i] = numberBit(number, top - (a + kSteps * s + i));
@@ -80,6 +85,9 @@ void MoxModel::stage(const std::vector<uint8_t>& number) {
 }
 
 void MoxModel::commit() {
+  if (!stagedSinceCommit_ && lastCommitCycle_ == cycle_) return;
+  stagedSinceCommit_ = false;
+  lastCommitCycle_ = cycle_;
   for (uint32_t i = 0; i < asyncOutCount_; ++i) {
     if (stagedAsyncUpdate_[i]) asyncOut_[i] = stagedAsyncValue_[i];
   }

@@ -20,10 +20,13 @@ class MoxModel {
   /// Bit lengths of the command lines this core accepts.
   uint32_t writeLength() const;  // code 01: 2*A_out + 17*S_out + 1
   uint32_t readLength() const;   // code 03: 4*A_in + 6*S_in + 16
+  /// A_out + S_out + A_in + S_in: the most that a commit visits.
+  uint64_t portBits() const;
 
   /// Code 01: `number` holds the line's data as a little-endian number of writeLength()-1 bits.
   void stage(const std::vector<uint8_t>& number);
-  /// Code 02: applies the staged image to the bits whose update character is '1'.
+  /// Code 02: applies the staged image to the bits whose update character is '1'. Committing the
+  /// same image again within the same cycle changes nothing, so it is skipped.
   void commit();
   /// Code 03: writes the input image, ceil(readLength()/8) bytes, little-endian.
   void capture(unsigned char* out) const;
@@ -71,6 +74,8 @@ class MoxModel {
   uint32_t cyclesPerSequence_;
   uint64_t cycle_ = 0;
   bool clearPending_ = false;
+  bool stagedSinceCommit_ = true;
+  uint64_t lastCommitCycle_ = 0;
 
   // Staged by code 01.
   std::vector<uint8_t> stagedAsyncValue_;

@@ -9,15 +9,38 @@
 
 #include "CommandParser.h"
 #include "DescriptionCheck.h"
+#include "HexNumber.h"
 #include "SimCore.h"
 #include "ZinTarget/StatusWord.h"
 
 namespace ZinSim {
 
+namespace {
+
+// The latest texts received, bounded by entries and bytes; a text longer than the byte limit
+// keeps its beginning.
+struct CommandLog {
+  void add(const std::string& text) {
+    texts.push_back(text.substr(0, Target::kCommandLogBytes));
+    bytes += texts.back().size();
+    trim();
+  }
+  void trim() {
+    while (texts.size() > limit || bytes > Target::kCommandLogBytes) {
+      bytes -= texts.front().size();
+      texts.pop_front();
+    }
+  }
+  std::deque<std::string> texts;
+  size_t limit = 1000;
+  size_t bytes = 0;
+};
+
+}  // namespace
+
 struct Target::State {
   CoreMap cores;
-  std::deque<std::string> log;
-  size_t logLimit = 1000;
+  CommandLog log;
   uint64_t flushes = 0;
   std::exception_ptr transferFailure;
   std::exception_ptr statusFailure;
@@ -61,10 +84,12 @@ MoxModel& moxAt(CoreMap& cores, const ZIN_CORE_REF& ref) {
 
 void applyLines(const std::vector<CommandLine>& lines, unsigned char* readData) {
   uint64_t offset = 0;
+  std::vector<uint8_t> number;  // one 01 line's data at a time
   for (const CommandLine& line : lines) {
     switch (line.code) {
       case kWrite:
-        line.core->stage(line.data);
+        parseHexNumber(line.data, line.bitLength - 1, &number);
+        line.core->stage(number);
         break;
       case kCommit:
         line.core->commit();
@@ -117,8 +142,7 @@ void Target::commandSequence(const std::string& text, unsigned char* readData,
                              uint32_t readBitCount) {
   std::lock_guard<std::mutex> lock(mutex_);
   State& s = *state_;
-  s.log.push_back(text);
-  while (s.log.size() > s.logLimit) s.log.pop_front();
+  s.log.add(text);
   if (s.transferFailure) std::rethrow_exception(std::exchange(s.transferFailure, nullptr));
   if (readBitCount != 0 && readData == nullptr) {
     throw std::invalid_argument("ZinSim: no read buffer for " + std::to_string(readBitCount) +
@@ -127,7 +151,7 @@ void Target::commandSequence(const std::string& text, unsigned char* readData,
   const std::vector<CommandLine> lines = parseCommandSequence(text, s.cores);
   const uint64_t needed = readByteCount(lines);
   const uint64_t held = (uint64_t{readBitCount} + 7) / 8;
-  if (readBitCount != 0 && needed > held) {
+  if (needed > held) {
     throw std::runtime_error("ZinSim: the command sequence shifts out " + std::to_string(needed) +
                              " bytes but the read buffer holds " + std::to_string(held));
   }
@@ -207,18 +231,19 @@ void Target::setCyclesPerSequence(uint32_t cycles) {
 
 std::vector<std::string> Target::commandLog() const {
   std::lock_guard<std::mutex> lock(mutex_);
-  return {state_->log.begin(), state_->log.end()};
+  return {state_->log.texts.begin(), state_->log.texts.end()};
 }
 
 void Target::clearCommandLog() {
   std::lock_guard<std::mutex> lock(mutex_);
-  state_->log.clear();
+  state_->log.texts.clear();
+  state_->log.bytes = 0;
 }
 
 void Target::setCommandLogLimit(size_t entries) {
   std::lock_guard<std::mutex> lock(mutex_);
-  state_->logLimit = entries;
-  while (state_->log.size() > entries) state_->log.pop_front();
+  state_->log.limit = entries;
+  state_->log.trim();
 }
 
 uint64_t Target::flushCount() const {

@@ -141,7 +141,13 @@ unsigned char* Zin_NumberUtil::reverseBinStr2Bin(const std::string& bits, unsign
   }
   const char* in = bits.data();
   const size_t whole = n / 8;
-  for (size_t i = 0; i < whole; ++i) {
+  size_t i = 0;
+  for (; i + 2 <= whole; i += 2) {
+    const unsigned ones = detail::onesLsbFirst16(in + 8 * i);
+    out[i] = static_cast<unsigned char>(ones);
+    out[i + 1] = static_cast<unsigned char>(ones >> 8);
+  }
+  for (; i < whole; ++i) {
     out[i] = static_cast<unsigned char>(detail::onesWordLsbFirst(detail::loadWord(in + 8 * i)));
   }
   if (n % 8 != 0) {

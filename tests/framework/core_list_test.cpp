@@ -6,16 +6,14 @@
 #include <cstring>
 #include <memory>
 #include <stdexcept>
-#include <thread>
 #include <vector>
 
+#include "ZinMOX/ZinMOX.h"
 #include "ZinRT/ZinJtag.h"
 #include "ZinRT/Zin_CoreComm.h"
 #include "ZinRT/Zin_CoreList.h"
-#include "ZinRT/Zin_Signal.h"
-#include "ZinRT/Zin_SignalCore.h"
-#include "ZinRT/Zin_SignalGroup.h"
 #include "ZinTarget/ScriptedTransport.h"
+#include "ZinTarget/StatusWord.h"
 
 using ZinRT::Zin_Core;
 using ZinRT::Zin_CoreList;
@@ -93,50 +91,59 @@ TEST_F(CoreListTest, ClosingASessionDestroysOnlyItsCores) {
   EXPECT_EQ(destroyed, 3);
 }
 
-TEST_F(CoreListTest, ConcurrentAddsAndLookupsKeepEveryCore) {
-  std::vector<std::thread> threads;
-  for (uint32_t t = 0; t < 4; ++t) {
-    threads.emplace_back([this, t] {
-      for (uint32_t i = 0; i < 50; ++i) {
-        const ZIN_CORE_REF ref{t, 0, i};
-        Zin_CoreList::addCore(handle, new CountedCore(handle, ref));
-        EXPECT_NE(Zin_CoreList::getCore(handle, ref), nullptr);
-      }
-    });
-  }
-  for (auto& thread : threads) thread.join();
-  EXPECT_EQ(Zin_CoreList::coreCount(handle), 200u);
-  Zin_CoreList::removeSessionCores(handle);
-  EXPECT_EQ(destroyed, 200);
-}
-
-TEST_F(CoreListTest, StatusReadFillsInfoAndTheAskedBits) {
+// Status reads through the C entry point, which reports failures as a status instead of
+// throwing (the kept bit counts are checked in tests/mox).
+TEST_F(CoreListTest, CStatusReadFillsInfoAndReportsFailures) {
   const ZIN_CORE_REF ref{1, 0, 2};
   transport->placeCore(ref, ZIN_CORE_INFO{7, 9, 10, 0, 3}, {0xFF, 0xFF, 0xFF});
   ZIN_CORE_INFO info{};
-  ZinRT::Zin_ByteBuffer status(4, 0, 0);
-  status[3] = 0x55;
-  ZinRT::Zin_CoreComm::getCoreStatus(handle, ref, &info, status, 12);
-  EXPECT_EQ(info.manufacturerId, 7u);
-  EXPECT_EQ(info.coreType, 9u);
-  EXPECT_EQ(info.coreRevision, 3u);
-  EXPECT_EQ(status.getBits(0, 32), 0x0FFFu);  // 12 bits, the rest zeroed
-
-  ZinRT::Zin_CoreComm::getCoreStatus(handle, ZIN_CORE_REF{3, 3, 3}, &info, status, 32);
-  EXPECT_EQ(info.coreType, 0u);
-  EXPECT_EQ(status.getBits(0, 32), 0u);
-
-  // The C entry point reports failures as a status instead of throwing.
   unsigned char bytes[2] = {0xAA, 0xAA};
   EXPECT_EQ(ZinCore_getCoreStatus(handle, ref, &info, bytes, 10), 0u);
   EXPECT_EQ(bytes[0], 0xFF);
   EXPECT_EQ(bytes[1], 0x03);
-  EXPECT_EQ(ZinCore_getCoreStatus(handle, ref, &info, nullptr, 0), 0u);
   EXPECT_EQ(info.manufacturerId, 7u);
+  EXPECT_EQ(info.coreRevision, 3u);
   transport->failNextStatusRead(ScriptedTransport::Failure::NonStandard);
   EXPECT_EQ(ZinCore_getCoreStatus(handle, ref, &info, nullptr, 0), 0x80000000u);
   EXPECT_EQ(info.coreType, 0u);
   EXPECT_EQ(ZinCore_getCoreStatus(handle + 1000, ref, &info, nullptr, 0), 0x80000000u);
+}
+
+// The target kit's status words (the scripted and the simulated targets answer them) decode to
+// what they were built from in each layout, and counts that a layout cannot hold are refused.
+TEST_F(CoreListTest, StatusWordsOfEveryLayoutDecodeToTheirFields) {
+  struct Case {
+    uint32_t major, minor, ai, si, ao, so, qxMajor, qxMinor;
+  };
+  const Case cases[] = {{6, 1, 255, 1, 0x80, 7, 0, 0},          // key 0x61: eight-bit counts
+                        {5, 18, 3, 4, 5, 6, 0, 0},              // key 0x52 (an OR, not a sum)
+                        {9, 15, 0xFFFF, 0x1234, 1, 300, 0, 0},  // sixteen-bit counts
+                        {10, 0, 3, 0xFFFF, 0x8001, 12, 0xF, 0xA5}};
+  ZIN_CORE_REF ref{1, 2, 0};
+  for (const Case& c : cases) {
+    ZinTarget::MoxStatus s;
+    s.majorVersion = c.major;
+    s.minorVersion = c.minor;
+    s.asyncInputCount = c.ai;
+    s.syncInputCount = c.si;
+    s.asyncOutputCount = c.ao;
+    s.syncOutputCount = c.so;
+    s.qxMajorVersion = c.qxMajor;
+    s.qxMinorVersion = c.qxMinor;
+    transport->placeMoxCore(ref, s);
+    ZINMOX_CORE_INFO info{};
+    ASSERT_EQ(ZinMOX_getInfo(handle, &ref, &info), 0u);
+    EXPECT_EQ((std::vector<uint32_t>{info.async_input_count, info.sync_input_count,
+                                     info.async_output_count, info.sync_output_count,
+                                     info.qx_major_version, info.qx_minor_version}),
+              (std::vector<uint32_t>{c.ai, c.si, c.ao, c.so, c.qxMajor, c.qxMinor}))
+        << c.major << "." << c.minor;
+    s.qxMajorVersion = 0x10;  // four bits in the full layout, none in the older ones
+    EXPECT_THROW(ZinTarget::buildMoxStatusWord(s), std::invalid_argument);
+    s.qxMajorVersion = 0;
+    s.syncInputCount = ZinTarget::versionKey(s) >= 0x62 ? 0x10000 : 0x100;
+    EXPECT_THROW(ZinTarget::buildMoxStatusWord(s), std::invalid_argument);
+  }
 }
 
 namespace {
@@ -165,29 +172,4 @@ TEST_F(CoreListTest, CommandSequenceDeliversReadDataAndFailures) {
   EXPECT_THROW(ZinRT::Zin_CoreComm::commandSequence(handle, "y", nullptr, 0, nullptr),
                std::runtime_error);
   EXPECT_EQ(transport->transfers().size(), 1u);
-}
-
-TEST(SignalCore, KeepsStatusCountsAndSignals) {
-  const unsigned char status[] = {0xAB, 0xCD, 0xEF};
-  ZinRT::Zin_SignalCore core(1, ZIN_CORE_REF{0, 0, 0}, ZIN_CORE_INFO{}, status, 12);
-  EXPECT_EQ(core.getStatusBuffer().getSize(), 2u);
-  EXPECT_EQ(core.getStatusBuffer().getBits(0, 16), 0xCDABu);
-  EXPECT_EQ(core.getCorePhysicalSignalCount(ZinRT::Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT), 0u);
-  core.setCorePhysicalSignalCount(ZinRT::Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT, 5);
-  EXPECT_EQ(core.getCorePhysicalSignalCount(ZinRT::Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT), 5u);
-
-  std::vector<uint32_t> positions{5, 2, 9};
-  ZinRT::Zin_SignalGroup group(ZinRT::Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_OUTPUT, 0, positions,
-                               "bus");
-  EXPECT_EQ(group.getType() & ~ZinRT::Zin_SignalBase::SIGNAL_TYPE_GROUP,
-            ZinRT::Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_OUTPUT);
-  ZinRT::Zin_Signal single(ZinRT::Zin_SignalBase::SIGNAL_TYPE_MOX_ASYNC_INPUT, 3, 0, "led");
-  core.addSignal(&group);
-  core.addSignal(&single);
-  EXPECT_EQ(core.getSignal("bus", group.getType(), 0), &group);
-  EXPECT_EQ(core.getSignal("led", single.getType(), 3), &single);
-  EXPECT_EQ(core.getSignal("led", single.getType(), 4), nullptr);
-  core.removeSignal(&single);
-  EXPECT_EQ(core.getSignal("led", single.getType(), 3), nullptr);
-  EXPECT_THROW(core.addSignal(nullptr), std::invalid_argument);
 }

@@ -3,11 +3,13 @@
 // that a port image the writer cannot render is a reported fault, never silently recomputed.
 #include <gtest/gtest.h>
 
+#include <memory>
 #include <random>
 #include <stdexcept>
 #include <string>
 #include <vector>
 
+#include "ZinRT/Zin_ByteBuffer.h"
 #include "ZinRT/Zin_NumberUtil.h"
 #include "format/ZinMOX_BitFormat.h"
 #include "internal/ZinMOX_Command.h"
@@ -105,6 +107,23 @@ TEST(BitFormat, ReadBitTextAndDigitValues) {
     ASSERT_EQ(ZinRT::mox::hexDigitValue(static_cast<char>(c)),
               ZinRT::Zin_NumberUtil::hexDigitValue(static_cast<char>(c)))
         << c;
+    std::string digits(40, 'F');  // the character in a block of sixteen, in a word and alone
+    for (const int at : {c % 16, 32 + c % 8, 39}) {
+      std::string text = digits;
+      text[static_cast<size_t>(at)] = static_cast<char>(c);
+      ASSERT_EQ(ZinRT::mox::allHexDigits(text.data(), text.size()),
+                ZinRT::mox::hexDigitValue(static_cast<char>(c)) >= 0)
+          << c << " at " << at;
+    }
+  }
+  // The hex text of a packed vector is the framework's, at every width across digits and bytes.
+  const unsigned char vector[] = {0xA5, 0x0F, 0x81, 0x7E, 0xC3, 0x3C, 0x96, 0x69, 0xFF};
+  const ZinRT::Zin_ByteBuffer buffer(vector, sizeof vector);
+  std::string text;
+  for (uint32_t n = 0; n <= 8 * sizeof vector; ++n) {
+    std::unique_ptr<ZinRT::Zin_ByteBuffer> expected(buffer.bin2HexString(0, n));
+    ZinRT::mox::packedHexText(vector, n, text);
+    ASSERT_EQ(text, expected->ptr()) << n;
   }
 }
 

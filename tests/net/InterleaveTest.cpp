@@ -6,10 +6,7 @@
 #include <thread>
 
 #include "NetTestUtil.h"
-#include "ZinMOX/ZinMOX.h"
 #include "ZinNet/TcpTransport.h"
-#include "ZinNet/ZinNet.h"
-#include "ZinRT/ZinJtag.h"
 
 namespace {
 
@@ -91,43 +88,6 @@ TEST(Interleave, ConcurrentClientsSequencesNeverInterleave) {
     EXPECT_EQ(text.size(), 50 * (head.size() + 100 + 1) + 10 * 1 + 40 * 2 + 1);  // line numbers
   }
   EXPECT_EQ(next, std::vector<int>(kClients, kSequences));
-}
-
-TEST(Interleave, ConcurrentSessionsWritingThroughTheLibraryLeaveConsistentImages) {
-  // Each client writes a 16-bit pattern whose two bytes agree, so a torn write would show up
-  // as a read whose bytes differ.
-  auto target = std::make_shared<ZinSim::Target>();
-  ZinNetTest::TestServer server(target);
-  ZIN_CORE_REF ref{0, 1, 0};
-  constexpr int kClients = 4;
-  std::atomic<int> failures{0};
-  std::atomic<int> torn{0};
-  std::vector<std::thread> threads;
-  for (int c = 0; c < kClients; ++c) {
-    threads.emplace_back([&, c] {
-      const uint32_t handle = ZinNet_openSession("127.0.0.1", server.port(), 5000);
-      if (handle == 0 || ZinMOX_initCore(handle, &ref) != ZINMOX_SUCCESS) {
-        ++failures;
-        return;
-      }
-      for (int i = 0; i < 25; ++i) {
-        char byte[3];
-        std::snprintf(byte, sizeof byte, "%02X", (c * 25 + i) & 0xFF);
-        ZinRT::ZinMOX_ValueMap out{{"async_out_data", std::string(byte) + byte}};
-        uintptr_t word = reinterpret_cast<uintptr_t>(&out);
-        if (ZinMOX_writeValues(handle, &ref, &word) != ZINMOX_SUCCESS) ++failures;
-        ZinRT::ZinMOX_ValueMap in;
-        word = reinterpret_cast<uintptr_t>(&in);
-        if (ZinMOX_readValues(handle, &ref, &word) != ZINMOX_SUCCESS) ++failures;
-        const std::string value = in["async_in_data"];
-        if (value.size() != 4 || value.substr(0, 2) != value.substr(2)) ++torn;
-      }
-      ZinJtag_closeSession(handle);
-    });
-  }
-  for (std::thread& t : threads) t.join();
-  EXPECT_EQ(failures, 0);
-  EXPECT_EQ(torn, 0);
 }
 
 }  // namespace

@@ -12,10 +12,11 @@
 #include <sstream>
 #include <string>
 
-#include "ChildProcess.h"
 #include "ZinHub/HubCodec.h"
+#include "support/ChildProcess.h"
 
 namespace ZinRtlTest {
+using namespace ZinTest;
 namespace {
 
 constexpr int kStartMs = 10000;

@@ -75,7 +75,19 @@ TEST(Description, EveryProblemIsNamedByItsPointer) {
       {withCore(R"({"qx_version": {"major": 16}})"), core + "/qx_version/major", "from 0 to 15"},
       {withCore(R"({"qx_version": {"beta": 1}})"), core + "/qx_version/beta", "unknown key"},
       {withCore(R"({"clock": {"cycles_per_sequence": 1.5}})"), core + "/clock/cycles_per_sequence",
-       "expected a number, found number"},
+       "expected a number from 0 to 4294967295, found 1.5"},
+      {withCore(R"({"async_inputs": 18446744073709551616})"), core + "/async_inputs",
+       "from 0 to 65535, found 1.8446744073709552e+19"},
+      // Nesting: 32 levels are read, 33 are not; a long value is echoed only in part.
+      {R"({"devices": [], "name": )" + std::string(32, '[') + std::string(32, ']') + "}", "/name",
+       "expected a text, found array"},
+      {R"({"devices": [], "name": )" + std::string(33, '[') + std::string(33, ']') + "}", "",
+       "nested deeper than 32 levels"},
+      {withCore(R"({"wiring": [{"input": )" + std::string(70000, '[') + std::string(70000, ']') +
+                "}]}"),
+       "", "nested deeper than 32 levels"},
+      {withCore(R"({"wiring": [{"input": ")" + std::string(40000, 'x') + "\"}]}"),
+       core + "/wiring/0/input", "found \"xxxxxxxx"},
       {withCore(R"({"wiring": {}})"), core + "/wiring", "expected an array"},
       {withCore(R"({"wiring": [{"source": {"kind": "constant"}}]})"), core + "/wiring/0/input",
        "missing; expected \"async\" or \"sync\""},
@@ -122,6 +134,7 @@ TEST(Description, EveryProblemIsNamedByItsPointer) {
       EXPECT_NE(e.problem().find(c.problem), std::string::npos) << e.what();
       const std::string shown = c.pointer.empty() ? "(description)" : c.pointer;
       EXPECT_EQ(std::string(e.what()).rfind(shown + ": ", 0), 0u) << e.what();
+      EXPECT_LT(e.problem().size(), 200u);
     }
   }
 }

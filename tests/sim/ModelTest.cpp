@@ -84,9 +84,12 @@ TEST_F(ModelTest, MalformedLinesAreRejectedWithNothingApplied) {
        "bit length 00000005 does not match the core: code 02 needs 00000004"},
       {"01 2 0 03 1 00000033 0", "code 03 needs 00000032"},
       {"01 2 0 01 0 0000002A 0", "code 01 needs 0000002B"},
-      {"01 2 0 01 0 0000002B 4XX", "data is not hexadecimal (character 2)"},
-      {"01 2 0 01 0 0000002B 400000000000", "data does not fit in 42 bits"},
+      {"01 2 0 01 0 0000002B 0XX00000000", "data is not hexadecimal (character 2)"},
+      {"01 2 0 01 0 0000002B 40000000000", "data does not fit in 42 bits"},
+      {"01 2 0 01 0 0000002B 0", "data has 1 digits; bit length 0000002B needs 11"},
+      {"01 2 0 01 0 0000002B 000000000000", "data has 12 digits"},
       {"01 2 0 02 0 00000004 1", "data must be 0 for code 02"},
+      {"01 2 0 02 0 00000004 00", "data must be 0 for code 02"},
       {"01 2 0 04 1 00000004 00000001", "data must be 0 for code 04"},
       {"", "expected 7 fields separated by single blanks, found 1"},
   };
@@ -108,13 +111,13 @@ TEST_F(ModelTest, MalformedLinesAreRejectedWithNothingApplied) {
   for (char& c : lower) c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
   target->commandSequence(lower, nullptr, 0);
   EXPECT_EQ(target->asyncOutputLevels(kRef), "1111");
-  // A value with leading zero digits beyond its width still fits.
-  target->commandSequence(kPrefix + "01 0 0000002B 0000000000000000", nullptr, 0);
 }
 
 TEST_F(ModelTest, ReadsNeedRoomForTheirDataAndFailuresCanBeInjected) {
   std::vector<unsigned char> small(6, 0);
   EXPECT_THROW(target->commandSequence(ZinTest::readCommandText(kPrefix, 4, 3), small.data(), 48),
+               std::runtime_error);
+  EXPECT_THROW(target->commandSequence(ZinTest::readCommandText(kPrefix, 4, 3), nullptr, 0),
                std::runtime_error);
   write(asyncImage("1000", "1000"));
   target->failNextTransfer("cable unplugged");
@@ -127,7 +130,7 @@ TEST_F(ModelTest, ReadsNeedRoomForTheirDataAndFailuresCanBeInjected) {
   EXPECT_EQ(target->asyncOutputLevels(kRef), "1000");
   write(asyncImage("0100", "1100"));
   EXPECT_EQ(target->asyncOutputLevels(kRef), "0100");
-  EXPECT_EQ(target->commandLog().size(), 4u);
+  EXPECT_EQ(target->commandLog().size(), 5u);
   target->setCommandLogLimit(2);
   EXPECT_EQ(target->commandLog().size(), 2u);
   EXPECT_EQ(target->commandLog().back(), writeText(kPrefix, asyncImage("0100", "1100")));
@@ -254,6 +257,25 @@ TEST_F(ModelTest, AChangeAtTheClearingEdgeStaysLatched) {
   EXPECT_EQ(bit1, "0101");  // changes at edges 2 and 4; where nothing changes the clear clears
 }
 
+TEST_F(ModelTest, AReadThatLetsNoTimePassClearsEveryLatchAsItsSequenceEnds) {
+  target->setCyclesPerSequence(0);
+  target->setInputSource(kRef, InputPort::Sync, 0, InputSource::loopback(OutputPort::Async, 0));
+  write(asyncImage("1000", "1000"));  // a rise and a fall, each sampled by a clock edge
+  target->advance(1);
+  write(asyncImage("0000", "1000"));
+  target->advance(1);
+  const ZinTest::InputImage set = read();
+  for (const std::string* latch : {&set.asyncUp, &set.asyncDown, &set.syncUp, &set.syncDown,
+                                   &set.syncSyncUp, &set.syncSyncDown}) {
+    EXPECT_EQ((*latch)[0], '1');
+  }
+  const ZinTest::InputImage cleared = read();
+  for (const std::string* latch : {&cleared.asyncUp, &cleared.asyncDown, &cleared.syncUp,
+                                   &cleared.syncDown, &cleared.syncSyncUp, &cleared.syncSyncDown}) {
+    EXPECT_EQ(latch->find('1'), std::string::npos) << *latch;
+  }
+}
+
 TEST_F(ModelTest, StatusAndCoreList) {
   ZIN_CORE_INFO info{};
   std::vector<unsigned char> status(16, 0);
@@ -307,6 +329,41 @@ TEST(ModelLargeCore, WholePortsOfTheLargestWidthRoundTrip) {
   for (uint32_t i = 0; i < kWidth; ++i) held[i] = image.steps[i][15];
   EXPECT_EQ(in.syncValue, held);
   EXPECT_EQ(in.syncSyncUp, held);
+}
+
+// A 01 line costs 131072, a 02 line after it 131071, a repeated 02 line 1: 256 pairs and 256
+// repeats are exactly the work limit, one more line is beyond it.
+TEST(ModelLargeCore, SequenceWorkAndTheCommandLogAreBounded) {
+  auto target = ZinSimTest::targetWith({moxCore({0, 0, 0}, 65535, 0, 65535, 0)});
+  const std::string pair =
+      "00 0 0 01 0 0001FFFF 3" + std::string(32767, 'F') + "\n" + "00 0 0 02 0 00000004 0\n";
+  std::string text;
+  for (int i = 0; i < 256; ++i) text += pair;
+  for (int i = 0; i < 256; ++i) text += "00 0 0 02 0 00000004 0\n";
+  text.pop_back();
+  target->commandSequence(text, nullptr, 0);
+  EXPECT_EQ(target->asyncOutputLevels({0, 0, 0}), std::string(65535, '1'));
+  try {
+    target->commandSequence(text + "\n00 0 0 02 0 00000004 0", nullptr, 0);
+    ADD_FAILURE() << "a sequence beyond the work limit was accepted";
+  } catch (const std::runtime_error& e) {
+    EXPECT_STREQ(e.what(),
+                 "ZinSim: command line 769: the sequence exceeds the work limit of 67108864 bit "
+                 "operations");
+  }
+  // The log keeps at most 8 MiB of text, and the beginning of a longer text.
+  const size_t half = ZinSim::Target::kCommandLogBytes / 2;
+  for (char c : {'a', 'b', 'c'}) {
+    EXPECT_THROW(target->commandSequence(std::string(half, c), nullptr, 0), std::runtime_error);
+  }
+  std::vector<std::string> log = target->commandLog();
+  ASSERT_EQ(log.size(), 2u);
+  EXPECT_EQ(log[0], std::string(half, 'b'));
+  EXPECT_THROW(target->commandSequence(std::string(2 * half + 1, 'd'), nullptr, 0),
+               std::runtime_error);
+  log = target->commandLog();
+  ASSERT_EQ(log.size(), 1u);
+  EXPECT_EQ(log[0], std::string(2 * half, 'd'));
 }
 
 TEST(ModelThreads, OneTargetServesSeveralThreads) {

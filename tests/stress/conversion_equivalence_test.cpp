@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <cctype>
 #include <memory>
 #include <random>
 #include <stdexcept>
@@ -32,6 +33,11 @@ std::string reversed(const std::string& text) {
   return std::string(text.rbegin(), text.rend());
 }
 
+std::string lowerCase(std::string text) {
+  for (char& c : text) c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+  return text;
+}
+
 std::string invalidArgumentOf(void (*call)()) {
   try {
     call();
@@ -51,10 +57,12 @@ TEST(ConversionEquivalence, FrameworkConversionsMatchBitByBitReferences) {
     const std::string msbFirst = reversed(reverse), hex = bitsToHex(msbFirst);
     EXPECT_EQ(Zin_NumberUtil::binStr2HexStr(msbFirst, out), hex) << n;
     EXPECT_EQ(Zin_NumberUtil::hexStr2BinStr(hex.c_str(), n, out), msbFirst);
+    EXPECT_EQ(Zin_NumberUtil::hexStr2BinStr(lowerCase(hex).c_str(), n, out), msbFirst);
     EXPECT_EQ(Zin_NumberUtil::bin2ReverseBinStr(bytes.data(), n, out), reverse);
-    std::vector<uint8_t> packed(n / 8 + 1, 0xEE);
+    std::vector<uint8_t> packed((n + 7) / 8 + 1, 0xEE);
     Zin_NumberUtil::reverseBinStr2Bin(reverse, packed.data());
     ASSERT_EQ(unpackBits(packed.data(), n), reverse) << n;
+    ASSERT_EQ(packed.back(), 0xEE) << "wrote past ceil(n/8) bytes, n = " << n;
 
     const ZinRT::Zin_ByteBuffer buffer(bytes.data(), static_cast<uint32_t>(bytes.size()));
     const auto start = static_cast<uint32_t>(rng() % 3);
@@ -63,8 +71,9 @@ TEST(ConversionEquivalence, FrameworkConversionsMatchBitByBitReferences) {
     tail.resize(n / 8 + 1, 0);  // bits past the buffer read as 0
     EXPECT_EQ(std::string(text->ptr()), bitsToHex(reversed(unpackBits(tail.data(), n))));
     if (hex.empty()) continue;
-    const ZinRT::Zin_ByteBuffer digits(reinterpret_cast<const unsigned char*>(hex.data()),
-                                       static_cast<uint32_t>(hex.size()));
+    const std::string lower = lowerCase(hex);
+    const ZinRT::Zin_ByteBuffer digits(reinterpret_cast<const unsigned char*>(lower.data()),
+                                       static_cast<uint32_t>(lower.size()));
     std::unique_ptr<ZinRT::Zin_ByteBuffer> back(
         digits.hex2Bin(0, static_cast<uint32_t>(hex.size() - 1)));
     ASSERT_EQ(unpackBits(back->uPtr(), n), reverse);

@@ -4,6 +4,7 @@
 // and a successful one none, and no thread receives a message about another thread's signals.
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <chrono>
 #include <cstdint>
 #include <memory>
@@ -29,6 +30,16 @@ thread_local std::vector<Delivered> delivered;
 
 void recordOnThisThread(void*, uint32_t handle, uint32_t code, const char* text) {
   delivered.push_back({handle, code, text != nullptr ? text : ""});
+}
+
+// A scripted target with a 16/12/16/12 MOX core at each of `refs`.
+std::shared_ptr<ZinTarget::ScriptedTransport> moxTarget(const std::vector<ZIN_CORE_REF>& refs) {
+  auto transport = std::make_shared<ZinTarget::ScriptedTransport>();
+  ZinTarget::MoxStatus status;
+  status.asyncInputCount = status.asyncOutputCount = 16;
+  status.syncInputCount = status.syncOutputCount = 12;
+  for (const ZIN_CORE_REF& ref : refs) transport->placeMoxCore(ref, status);
+  return transport;
 }
 
 // "t<id>_", the start of every signal name of one thread. (Built by appending: g++ 12 mistakes
@@ -130,16 +141,8 @@ class Worker {
 
 TEST(ThreadStress, ThreadsOnSharedAndSeparateSessionsKeepTheirMessagesApart) {
   const ZIN_CORE_REF first{1, 2, 0}, second{1, 2, 1};
-  ZinTarget::MoxStatus status;
-  status.asyncInputCount = status.asyncOutputCount = 16;
-  status.syncInputCount = status.syncOutputCount = 12;
-  auto sharedTarget = std::make_shared<ZinTarget::ScriptedTransport>();
-  auto separateTarget = std::make_shared<ZinTarget::ScriptedTransport>();
-  sharedTarget->placeMoxCore(first, status);
-  sharedTarget->placeMoxCore(second, status);
-  separateTarget->placeMoxCore(first, status);
-  const uint32_t shared = ZinJtag_openSession(sharedTarget);
-  const uint32_t separate = ZinJtag_openSession(separateTarget);
+  const uint32_t shared = ZinJtag_openSession(moxTarget({first, second}));
+  const uint32_t separate = ZinJtag_openSession(moxTarget({first}));
   const std::vector<std::pair<uint32_t, ZIN_CORE_REF>> places = {
       {shared, first},  {shared, first},   {shared, first},
       {shared, second}, {separate, first}, {separate, first}};
@@ -162,6 +165,34 @@ TEST(ThreadStress, ThreadsOnSharedAndSeparateSessionsKeepTheirMessagesApart) {
     EXPECT_FALSE(ZinJtag_session_isLocked(handle));
     ZinJtag_closeSession(handle);
   }
+}
+
+// A close waits for the call in progress on another thread instead of destroying its core under
+// it, and a call after the close fails cleanly.
+TEST(ThreadStress, CloseWaitsForTheCallInProgressAndLaterCallsFail) {
+  ZIN_CORE_REF ref{1, 2, 0};
+  const auto transport = moxTarget({ref});
+  const uint32_t handle = ZinJtag_openSession(transport);
+  ZinJtag_setMessageHandler(handle, &recordOnThisThread, nullptr);
+  ASSERT_EQ(ZinMOX_initCore(handle, &ref), 0u);
+  ZinRT::ZinMOX_ValueMap map;
+  uintptr_t word = reinterpret_cast<uintptr_t>(&map);
+  transport->blockNextCommand();
+  std::atomic<uint32_t> readResult{1};
+  std::thread reader([&] { readResult = ZinMOX_readValues(handle, &ref, &word); });
+  ASSERT_TRUE(transport->waitUntilBlocked(5000));
+  std::atomic<bool> closed{false};
+  std::thread closer([&] {
+    ZinJtag_closeSession(handle);
+    closed = true;
+  });
+  std::this_thread::sleep_for(std::chrono::milliseconds(200));
+  EXPECT_FALSE(closed) << "the close did not wait for the call in progress";
+  transport->release();
+  reader.join();
+  closer.join();
+  EXPECT_EQ(readResult, 0u);
+  EXPECT_EQ(ZinMOX_readValues(handle, &ref, &word), kFailure);
 }
 
 }  // namespace

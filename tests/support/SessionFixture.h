@@ -46,8 +46,6 @@ class SessionFixture : public ::testing::Test {
   /// Checks that `result` is a failure reported by exactly one message with code 256, sent
   /// after the target lock was released, and returns its text. Clears the record.
   std::string errorOf(uint32_t result);
-  /// errorOf for a call whose result was already checked.
-  void expectOnlyError(const std::string& text) { EXPECT_EQ(errorOf(kFailure), text); }
   /// Checks for the two messages of a call on a core of the wrong type: `text` (code 256) while
   /// the lock is held, then "Zin abort command" (code 32768) after it. Clears the record.
   void expectWrongCoreType(const std::string& text);

@@ -2,7 +2,6 @@
 #include <gtest/gtest.h>
 
 #include "ToolOutput.h"
-#include "ToolRunner.h"
 #include "ZinSim/Description.h"
 
 namespace {
@@ -27,45 +26,20 @@ std::string refText(const ZIN_CORE_REF& ref) {
          std::to_string(ref.coreIndex);
 }
 
-std::string version(const ZinSim::CoreDescription& core) {
-  return std::to_string(core.majorVersion) + "." + std::to_string(core.minorVersion) + "." +
-         std::to_string(core.revision);
-}
-
 // Scan rows, the loopback of a value and a pulse train, and the counter seen by watch.
 TEST(Demo, ShowsTheDemoDesignAndItsLoopback) {
   const auto result = runTool({"demo"});
   ASSERT_EQ(result.status, 0) << result.err;
   EXPECT_EQ(result.err, "");
 
+  // Scan and info show the demo design (their fields are compared with it in JsonOutputTest).
   const ZinSim::TargetDescription design = ZinSim::demoDescription();
-  ASSERT_EQ(design.cores.size(), 4u);
   for (const ZinSim::CoreDescription& core : design.cores) {
-    const auto rows = rowsStartingWith(result.out, refText(core.ref));
-    ASSERT_EQ(rows.size(), 1u) << refText(core.ref);
-    const auto& row = rows[0];
-    if (core.type == ZinSim::kMoxCoreType) {
-      ASSERT_EQ(row.size(), 8u);
-      EXPECT_EQ(row[1], "MOX");
-      EXPECT_EQ(row[2], version(core));
-      EXPECT_EQ(row[4], std::to_string(core.asyncOutputs));
-      EXPECT_EQ(row[5], std::to_string(core.syncOutputs));
-      EXPECT_EQ(row[6], std::to_string(core.asyncInputs));
-      EXPECT_EQ(row[7], std::to_string(core.syncInputs));
-    } else {
-      EXPECT_EQ(row[2], std::to_string(core.type));  // "type N"
-      EXPECT_EQ(row[3], version(core));
-    }
+    EXPECT_EQ(rowsStartingWith(result.out, refText(core.ref)).size(), 1u) << refText(core.ref);
   }
-
-  // info 0:1:0 lists the widths of the full-layout core.
-  const ZinSim::CoreDescription& full = design.cores[0];
-  EXPECT_EQ(rowsStartingWith(result.out, "async_output_count")[0][1],
-            std::to_string(full.asyncOutputs));
   EXPECT_EQ(rowsStartingWith(result.out, "sync_input_count")[0][1],
-            std::to_string(full.syncInputs));
-  EXPECT_EQ(rowsStartingWith(result.out, "qx_minor_version")[0][1],
-            std::to_string(full.qxMinorVersion));
+            std::to_string(design.cores[0].syncInputs))
+      << "info 0:1:0 lists the widths of the full-layout core";
 
   // Two reads: the written value loops back with its rising activity once; the one-step pulse
   // train rises in the first read and falls in the second.

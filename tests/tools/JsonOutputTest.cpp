@@ -2,7 +2,6 @@
 #include <gtest/gtest.h>
 
 #include "ToolOutput.h"
-#include "ToolRunner.h"
 #include "ZinSim/Description.h"
 
 namespace {
@@ -91,24 +90,6 @@ TEST(JsonOutput, ReadsShowTheLoopbackOfWrites) {
   EXPECT_EQ(ports["async_in"]["activity_down"], "04");
   EXPECT_EQ(ports["sync_in"]["value"], "3");
   EXPECT_FALSE(ports["async_in"].contains("sync_activity_up"));
-}
-
-// The table and the JSON of one read state the same values.
-TEST(JsonOutput, AgreesWithTheTable) {
-  const auto result = runTool({"run", "-"},
-                              "write 0:1:0 async_out_data=1234\n"
-                              "read 0:1:0 async_in_data\n"
-                              "write 0:1:0 async_out_data=1234\n"
-                              "read 0:1:0 async_in_data --json\n");
-  ASSERT_EQ(result.status, 0) << result.err;
-  const auto rows = zinmox_test::rowsStartingWith(result.out, "async_in_data");
-  ASSERT_EQ(rows.size(), 1u);
-  const auto documents = jsonDocuments(result.out);
-  ASSERT_EQ(documents.size(), 1u);
-  const json& signal = documents[0]["signals"][0];
-  EXPECT_EQ(rows[0][2], signal["value"]);
-  EXPECT_EQ(signal["value"], "1234");
-  EXPECT_EQ(signal["activity_up"], "0000") << "an unchanged write brings no activity";
 }
 
 }  // namespace

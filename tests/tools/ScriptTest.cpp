@@ -2,7 +2,6 @@
 #include <gtest/gtest.h>
 
 #include "ToolOutput.h"
-#include "ToolRunner.h"
 
 namespace {
 

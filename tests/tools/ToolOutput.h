@@ -1,4 +1,4 @@
-// Reading the tool's tables and JSON back in tests.
+// Running the built zinmox tool in tests, and reading its tables and JSON back.
 #ifndef ZINMOX_TOOL_TESTS_TOOLOUTPUT_H
 #define ZINMOX_TOOL_TESTS_TOOLOUTPUT_H
 
@@ -7,7 +7,17 @@
 #include <string>
 #include <vector>
 
+#include "support/ChildProcess.h"
+
 namespace zinmox_test {
+
+using ToolResult = ZinTest::ProcessResult;
+using ZinTest::writeTempFile;
+
+/// Runs zinmox with `args` to its end, feeding `input` to its standard input.
+inline ToolResult runTool(const std::vector<std::string>& args, const std::string& input = "") {
+  return ZinTest::runProcess(ZINMOX_TOOL_PATH, args, input);
+}
 
 /// The blank-separated fields of every line of `text` whose first field is `first`, in order.
 inline std::vector<std::vector<std::string>> rowsStartingWith(const std::string& text,

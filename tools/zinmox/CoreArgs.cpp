@@ -1,7 +1,7 @@
 // The core reference and the signals file of the core subcommands.
 #include "CoreArgs.h"
 
-#include "CoreRef.h"
+#include "ZinHost/CoreRef.h"
 
 namespace zinmox {
 
@@ -19,7 +19,7 @@ void addSignalsOption(CLI::App& command, CoreArgs& args) {
 }
 
 ZIN_CORE_REF prepareCore(Session& session, const CoreArgs& args) {
-  const ZIN_CORE_REF ref = parseCoreRef(args.ref);
+  const ZIN_CORE_REF ref = ZinHost::parseCoreRef(args.ref);
   session.useCore(ref);
   if (!args.signalsFile.empty()) session.loadSignals(ref, args.signalsFile);
   return ref;

@@ -4,6 +4,9 @@
 #include <iostream>
 
 #include "Errors.h"
+#include "ZinHost/SignalsFile.h"
+#include "ZinHost/Target.h"
+#include "ZinHost/TextError.h"
 
 namespace zinmox {
 
@@ -50,6 +53,11 @@ int execute(CLI::App& app, const std::function<void()>& parse) {
     return usageError(app, error.what());
   } catch (const UsageError& error) {
     return usageError(app, error.what());
+  } catch (const ZinHost::TextError& error) {
+    return usageError(app, error.what());
+  } catch (const ZinHost::TargetError& error) {
+    if (error.kind() == ZinHost::TargetError::Kind::Malformed) return usageError(app, error.what());
+    return failure(error.what());
   } catch (const Failure& error) {
     return failure(error.what());
   } catch (const ExitRequest& request) {

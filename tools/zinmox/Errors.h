@@ -7,8 +7,9 @@
 
 namespace zinmox {
 
-/// The command line or a script line asks for something malformed: a bad reference, a bad hex
-/// text, a missing argument. Reported with a short hint; exit status 2.
+/// The command line or a script line asks for something malformed: a missing argument, a
+/// conflict between options. Reported with a short hint; exit status 2. (Malformed references,
+/// values, bit lists and names raise ZinHost::TextError, which is reported the same way.)
 class UsageError : public std::runtime_error {
  public:
   using std::runtime_error::runtime_error;

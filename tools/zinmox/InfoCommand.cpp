@@ -1,11 +1,10 @@
 // zinmox info REF: the twelve fields of a MOX core's information.
 #include <iostream>
-#include <nlohmann/json.hpp>
 
 #include "Commands.h"
 #include "CoreArgs.h"
-#include "CoreRef.h"
-#include "Table.h"
+#include "ZinHost/CoreRef.h"
+#include "ZinHost/Report.h"
 #include "ZinMOX/ZinMOX.h"
 #include "ZinMOX/ZinMOX_CoreInfoFields.h"
 
@@ -19,24 +18,16 @@ struct InfoArgs {
 };
 
 void showInfo(Session& session, const InfoArgs& args) {
-  ZIN_CORE_REF ref = parseCoreRef(args.core.ref);
+  ZIN_CORE_REF ref = ZinHost::parseCoreRef(args.core.ref);
   ZinRT::ZinMOX_ValueMap values;
   uintptr_t word = reinterpret_cast<uintptr_t>(&values);
   session.check(ZinMOX_getCoreInfo(session.handle(), &ref, &word),
                 "reading the information of core " + args.core.ref);
-  if (args.json) {
-    nlohmann::json object{{"core", formatCoreRef(ref)}};
-    for (const ZinRT::ZinMOX_CoreInfoField& field : ZinRT::ZINMOX_CORE_INFO_FIELDS) {
-      object[field.key] = std::stoul(values.at(field.key));
-    }
-    std::cout << object.dump(2) << "\n";
-    return;
-  }
-  Table table({"field", "value"});
+  ZINMOX_CORE_INFO info{};
   for (const ZinRT::ZinMOX_CoreInfoField& field : ZinRT::ZINMOX_CORE_INFO_FIELDS) {
-    table.addRow({field.key, values.at(field.key)});
+    info.*field.member = static_cast<uint32_t>(std::stoul(values.at(field.key)));
   }
-  table.print(std::cout);
+  ZinHost::printInfo(std::cout, ref, info, args.json);
 }
 
 }  // namespace

@@ -4,13 +4,17 @@
 #include <algorithm>
 #include <map>
 
-#include "CoreRef.h"
-#include "Signals.h"
+#include "ZinHost/CoreRef.h"
+#include "ZinHost/Signals.h"
 #include "ZinMOX/ZinMOX.h"
 
 namespace zinmox {
 
 namespace {
+
+using ZinHost::formatCoreRef;
+using ZinHost::isReservedName;
+using ZinHost::lowerCase;
 
 const std::string kActivityUp = ".activity_up";
 

@@ -6,20 +6,12 @@
 #include <vector>
 
 #include "Session.h"
+#include "ZinHost/Report.h"
 #include "ZinRT/ZinCore_Types.h"
 
 namespace zinmox {
 
-struct InputValue {
-  std::string name;
-  uint32_t width = 0;
-  bool sync = false;
-  std::string value;
-  std::string activityUp;
-  std::string activityDown;
-  std::string syncActivityUp;  // synchronous inputs only
-  std::string syncActivityDown;
-};
+using InputValue = ZinHost::InputReading;
 
 /// Reads every input of the core in one transfer and returns the signals asked for, in the
 /// order asked; with no names, every input signal (user names sorted, then the whole ports).

@@ -5,15 +5,25 @@
 
 #include "Commands.h"
 #include "CoreArgs.h"
-#include "CoreRef.h"
 #include "Errors.h"
-#include "Hex.h"
-#include "Table.h"
+#include "ZinHost/CoreRef.h"
+#include "ZinHost/Table.h"
+#include "ZinHost/ValueText.h"
 #include "ZinMOX/ZinMOX.h"
 
 namespace zinmox {
 
 namespace {
+
+using ZinHost::formatCoreRef;
+using ZinHost::hexToPacked;
+using ZinHost::packedToHex;
+using ZinHost::Table;
+
+// The digits of a hex option, after the clients' "0x" rule.
+std::string cleanHex(const std::string& text, const std::string& what) {
+  return ZinHost::hexDigits(text, what);
+}
 
 constexpr uint32_t kSteps = 16;
 
@@ -23,13 +33,6 @@ struct PortsArgs {
   std::optional<std::string> async, asyncMask, sync, syncTrain, syncMask;
 };
 
-ZINMOX_CORE_INFO coreInfo(Session& session, ZIN_CORE_REF ref) {
-  ZINMOX_CORE_INFO info{};
-  session.check(ZinMOX_getInfo(session.handle(), &ref, &info),
-                "reading the information of " + formatCoreRef(ref));
-  return info;
-}
-
 struct PortVectors {
   const char* name;
   uint32_t width;
@@ -38,7 +41,7 @@ struct PortVectors {
 
 void readPorts(Session& session, const PortsArgs& args) {
   ZIN_CORE_REF ref = prepareCore(session, args.core);
-  const ZINMOX_CORE_INFO info = coreInfo(session, ref);
+  const ZINMOX_CORE_INFO info = session.coreInfo(ref);
   PortVectors async{"async_in", info.async_input_count, {}};
   PortVectors sync{"sync_in", info.sync_input_count, {}};
   async.vectors.assign(3, std::vector<uint8_t>((async.width + 7) / 8 + 1, 0));
@@ -114,7 +117,7 @@ void writePorts(Session& session, const PortsArgs& args) {
     throw UsageError("--sync-mask needs --sync or --sync-train");
   }
   ZIN_CORE_REF ref = prepareCore(session, args.core);
-  const ZINMOX_CORE_INFO info = coreInfo(session, ref);
+  const ZINMOX_CORE_INFO info = session.coreInfo(ref);
   std::vector<uint8_t> asyncData, asyncMask, syncData, syncMask;
   uint32_t asyncCount = 0;
   uint32_t syncCount = 0;

@@ -1,12 +1,10 @@
 // zinmox read REF [NAME ...]: values and activity of named inputs, as a table or as JSON.
 #include <iostream>
-#include <nlohmann/json.hpp>
 
 #include "Commands.h"
 #include "CoreArgs.h"
-#include "CoreRef.h"
 #include "InputValues.h"
-#include "Table.h"
+#include "ZinHost/Report.h"
 
 namespace zinmox {
 
@@ -17,34 +15,6 @@ struct ReadArgs {
   std::vector<std::string> names;
   bool json = false;
 };
-
-void printTable(const std::vector<InputValue>& inputs) {
-  Table table({"name", "width", "value", "activity_up", "activity_down", "sync_activity_up",
-               "sync_activity_down"});
-  for (const InputValue& input : inputs) {
-    table.addRow({input.name, std::to_string(input.width), input.value, input.activityUp,
-                  input.activityDown, input.sync ? input.syncActivityUp : "-",
-                  input.sync ? input.syncActivityDown : "-"});
-  }
-  table.print(std::cout);
-}
-
-void printJson(const ZIN_CORE_REF& ref, const std::vector<InputValue>& inputs) {
-  nlohmann::json list = nlohmann::json::array();
-  for (const InputValue& input : inputs) {
-    nlohmann::json entry{{"name", input.name},
-                         {"width", input.width},
-                         {"value", input.value},
-                         {"activity_up", input.activityUp},
-                         {"activity_down", input.activityDown}};
-    if (input.sync) {
-      entry["sync_activity_up"] = input.syncActivityUp;
-      entry["sync_activity_down"] = input.syncActivityDown;
-    }
-    list.push_back(entry);
-  }
-  std::cout << nlohmann::json{{"core", formatCoreRef(ref)}, {"signals", list}}.dump(2) << "\n";
-}
 
 }  // namespace
 
@@ -64,11 +34,7 @@ void addReadCommand(CLI::App& app, Session& session) {
   command->callback([&session, args] {
     const ZIN_CORE_REF ref = prepareCore(session, args->core);
     const std::vector<InputValue> inputs = readInputValues(session, ref, args->names);
-    if (args->json) {
-      printJson(ref, inputs);
-    } else {
-      printTable(inputs);
-    }
+    ZinHost::printReadings(std::cout, ref, inputs, args->json);
   });
 }
 

@@ -5,10 +5,11 @@
 #include <cstdio>
 #include <iostream>
 
-#include "CoreRef.h"
 #include "Errors.h"
-#include "SignalsFile.h"
-#include "TargetOpen.h"
+#include "ZinHost/BitList.h"
+#include "ZinHost/CoreRef.h"
+#include "ZinHost/SignalsFile.h"
+#include "ZinHost/Target.h"
 #include "ZinMOX/ZinMOX.h"
 #include "ZinRT/ZinCore_Types.h"
 #include "ZinRT/ZinJtag.h"
@@ -17,6 +18,9 @@
 namespace zinmox {
 
 namespace {
+
+using ZinHost::formatCoreRef;
+using ZinHost::Port;
 
 uint32_t packRef(const ZIN_CORE_REF& ref) {
   return (ref.deviceIndex << 8) | (ref.userChainNumber << 4) | ref.coreIndex;
@@ -58,7 +62,7 @@ void Session::setTargetText(const std::string& targetText) {
 
 uint32_t Session::handle() {
   if (handle_ != 0) return handle_;
-  transport_ = openTarget(targetText_);
+  transport_ = ZinHost::openTarget(targetText_).transport;
   handle_ = ZinJtag_openSession(transport_);
   ZinJtag_setMessageHandler(handle_, &Session::onMessage, this);
   return handle_;
@@ -91,7 +95,7 @@ std::vector<ZIN_CORE_REF> Session::listCores() {
   ZinJtag_session_withTransport(
       session, [&](ZinRT::Zin_Transport& transport) { listed = transport.listCores(refs); });
   if (!listed) return probeCores(session);
-  std::sort(refs.begin(), refs.end(), coreRefLess);
+  std::sort(refs.begin(), refs.end(), ZinHost::coreRefLess);
   return refs;
 }
 
@@ -110,17 +114,30 @@ void Session::useCore(const ZIN_CORE_REF& ref) {
   cores_[key];
 }
 
-void Session::defineSignal(const ZIN_CORE_REF& ref, const SignalDefinition& signal) {
+const ZINMOX_CORE_INFO& Session::coreInfo(const ZIN_CORE_REF& ref) {
   useCore(ref);
-  auto& defined = cores_[packRef(ref)];
-  const DefinitionKey key{isInput(signal.port), lowerCase(signal.name)};
+  std::optional<ZINMOX_CORE_INFO>& info = cores_[packRef(ref)].info;
+  if (!info) {
+    ZIN_CORE_REF copy = ref;
+    ZINMOX_CORE_INFO read{};
+    check(ZinMOX_getInfo(handle(), &copy, &read),
+          "reading the information of core " + formatCoreRef(ref));
+    info = read;
+  }
+  return *info;
+}
+
+void Session::defineSignal(const ZIN_CORE_REF& ref, const ZinHost::SignalDefinition& signal) {
+  useCore(ref);
+  auto& defined = cores_[packRef(ref)].definitions;
+  const DefinitionKey key{ZinHost::isInput(signal.port), ZinHost::lowerCase(signal.name)};
   const auto found = defined.find(key);
   if (found != defined.end()) {
     if (found->second.port == signal.port && found->second.bits == signal.bits) return;
     undefineSignal(ref, signal.name, found->second.port);
   }
   ZIN_CORE_REF copy = ref;
-  const uint32_t type = portSignalType(signal.port);
+  const uint32_t type = ZinHost::portSignalType(signal.port);
   const uint32_t rc =
       signal.bits.size() == 1
           ? ZinMOX_defineSignal(handle(), &copy, signal.name.c_str(), type, signal.bits[0])
@@ -129,8 +146,9 @@ void Session::defineSignal(const ZIN_CORE_REF& ref, const SignalDefinition& sign
   try {
     check(rc, "defining " + signal.name);
   } catch (const Failure&) {
-    throw Failure("could not define " + signal.name + " as " + portName(signal.port) + " bits " +
-                  formatBitList(signal.bits) + " on core " + formatCoreRef(ref));
+    throw Failure("could not define " + signal.name + " as " + ZinHost::portName(signal.port) +
+                  " bits " + ZinHost::formatBitList(signal.bits) + " on core " +
+                  formatCoreRef(ref));
   }
   defined[key] = Definition{signal.port, signal.bits};
 }
@@ -138,14 +156,15 @@ void Session::defineSignal(const ZIN_CORE_REF& ref, const SignalDefinition& sign
 void Session::undefineSignal(const ZIN_CORE_REF& ref, const std::string& name, Port port) {
   useCore(ref);
   ZIN_CORE_REF copy = ref;
-  check(ZinMOX_undefineName(handle(), &copy, name.c_str(), portSignalType(port)),
+  check(ZinMOX_undefineName(handle(), &copy, name.c_str(), ZinHost::portSignalType(port)),
         "removing " + name);
-  cores_[packRef(ref)].erase(DefinitionKey{isInput(port), lowerCase(name)});
+  cores_[packRef(ref)].definitions.erase(
+      DefinitionKey{ZinHost::isInput(port), ZinHost::lowerCase(name)});
 }
 
 void Session::loadSignals(const ZIN_CORE_REF& ref, const std::string& path) {
-  const std::vector<SignalDefinition> signals = loadSignalsFile(path);
-  for (const SignalDefinition& signal : signals) defineSignal(ref, signal);
+  const auto signals = ZinHost::loadSignalsFile(path, &coreInfo(ref));
+  for (const ZinHost::SignalDefinition& signal : signals) defineSignal(ref, signal);
 }
 
 }  // namespace zinmox

@@ -7,10 +7,12 @@
 #include <functional>
 #include <map>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
-#include "Signals.h"
+#include "ZinHost/Signals.h"
+#include "ZinMOX/ZinMOX.h"
 #include "ZinRT/ZinCore_Types.h"
 #include "ZinRT/Zin_Transport.h"
 
@@ -18,7 +20,7 @@ namespace zinmox {
 
 class Session {
  public:
-  /// `targetText` as openTarget takes it; nothing is opened until the first use.
+  /// `targetText` as ZinHost::openTarget takes it; nothing is opened until the first use.
   explicit Session(std::string targetText = "");
   ~Session();
   Session(const Session&) = delete;
@@ -43,12 +45,14 @@ class Session {
 
   /// Makes sure the core at `ref` is initialised in this session (once per reference).
   void useCore(const ZIN_CORE_REF& ref);
+  /// The information of an initialised core (its port widths), read once per core.
+  const ZINMOX_CORE_INFO& coreInfo(const ZIN_CORE_REF& ref);
   /// Defines a signal on an initialised core. An identical definition made before is kept; a
   /// different one of the same name and direction is replaced.
-  void defineSignal(const ZIN_CORE_REF& ref, const SignalDefinition& signal);
+  void defineSignal(const ZIN_CORE_REF& ref, const ZinHost::SignalDefinition& signal);
   /// Removes a name that was defined on the core.
-  void undefineSignal(const ZIN_CORE_REF& ref, const std::string& name, Port port);
-  /// Reads a signals file and defines its signals on the core.
+  void undefineSignal(const ZIN_CORE_REF& ref, const std::string& name, ZinHost::Port port);
+  /// Reads a signals file and defines its signals on the core (lists capped at the port widths).
   void loadSignals(const ZIN_CORE_REF& ref, const std::string& path);
 
   /// Whether the current command runs as a line of a script (run, demo).
@@ -58,11 +62,15 @@ class Session {
  private:
   static void onMessage(void* user, uint32_t handle, uint32_t code, const char* text);
 
+  using DefinitionKey = std::pair<bool, std::string>;  // (input?, lower-case name)
   struct Definition {
-    Port port;
+    ZinHost::Port port;
     std::vector<uint32_t> bits;
   };
-  using DefinitionKey = std::pair<bool, std::string>;  // (input?, lower-case name)
+  struct CoreState {
+    std::map<DefinitionKey, Definition> definitions;
+    std::optional<ZINMOX_CORE_INFO> info;
+  };
 
   std::string targetText_;
   std::shared_ptr<ZinRT::Zin_Transport> transport_;
@@ -71,7 +79,7 @@ class Session {
   uint64_t checkedCount_ = 0;  // messageCount_ at the last check
   bool inScript_ = false;
   std::function<void(uint32_t, const std::string&)> observer_;
-  std::map<uint32_t, std::map<DefinitionKey, Definition>> cores_;  // by packed reference
+  std::map<uint32_t, CoreState> cores_;  // by packed reference
 };
 
 }  // namespace zinmox

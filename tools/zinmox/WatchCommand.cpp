@@ -127,11 +127,19 @@ void addWatchCommand(CLI::App& app, Session& session) {
       "watch", "Read named inputs repeatedly, one line per read, marking changes and activity");
   addRefArgument(*command, args->core);
   command->add_option("NAME", args->names, "inputs to watch (default: every input)");
+  // Unsigned options would take "-1" as a huge number, so negative texts are refused first.
+  const CLI::Validator notNegative(
+      [](std::string& text) {
+        return text.find('-') == std::string::npos ? std::string() : "must not be negative";
+      },
+      "", "not negative");
   command->add_option("--interval", args->intervalMs, "milliseconds between reads")
       ->type_name("MS")
+      ->check(notNegative)
       ->capture_default_str();
   command->add_option("--count", args->count, "stop after N reads (default: until Ctrl-C)")
-      ->type_name("N");
+      ->type_name("N")
+      ->check(notNegative);
   command
       ->add_option("--vcd", args->vcdFile,
                    "also write the reads to FILE as a value-change dump: each input and its "

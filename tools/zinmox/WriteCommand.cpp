@@ -5,8 +5,8 @@
 #include "Commands.h"
 #include "CoreArgs.h"
 #include "Errors.h"
-#include "Hex.h"
-#include "Signals.h"
+#include "ZinHost/Signals.h"
+#include "ZinHost/ValueText.h"
 #include "ZinMOX/ZinMOX.h"
 
 namespace zinmox {
@@ -34,8 +34,8 @@ void addAssignment(const std::string& text, ZinRT::ZinMOX_ValueMap& values,
   if (dot != std::string::npos && key.substr(dot + 1) != kPulseTrain) {
     throw UsageError("unknown suffix in '" + key + "': only NAME.pulsetrain is written");
   }
-  const std::string hex = cleanHex(text.substr(equals + 1), "the value of " + key);
-  if (!seen.insert(lowerCase(name)).second) {
+  const std::string hex = ZinHost::hexDigits(text.substr(equals + 1), "the value of " + key);
+  if (!seen.insert(ZinHost::lowerCase(name)).second) {
     throw UsageError(name + " is given more than once");
   }
   values[key] = hex;

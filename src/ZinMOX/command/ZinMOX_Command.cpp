@@ -14,7 +14,6 @@ namespace ZinRT {
 
 namespace {
 
-constexpr char STEPS_OF_ZERO[] = "0000000000000000";
 // Bits per asynchronous and synchronous input bit in the read data.
 constexpr uint32_t ASYNC_IN_BITS = 4;
 constexpr uint32_t SYNC_IN_BITS = 6;
@@ -26,27 +25,43 @@ constexpr uint32_t READ_TRAILER_BITS = 16;
 // Characters of a line without its data: "DD C I CC F LLLLLLLL " and the newline.
 constexpr size_t SHORT_LINE_LENGTH = 22 + 1;
 
+// `value` as `widthBits`/4 upper-case hex digits and a blank. A value that does not fit is
+// left to the framework's conversion, which fails with its own message.
+void appendField(std::string& text, uint32_t value, uint32_t widthBits, std::string& scratch) {
+  const uint32_t digits = widthBits / 4;
+  if (digits > 8 || (digits < 8 && (static_cast<uint64_t>(value) >> (4 * digits)) != 0)) {
+    text += Zin_NumberUtil::uInt2HexStr(value, widthBits, scratch);
+    text += ' ';
+    return;
+  }
+  char field[9];
+  for (uint32_t k = 0; k < digits; ++k)
+    field[digits - 1 - k] = mox::kHexDigits[(value >> (4 * k)) & 0x0F];
+  field[digits] = ' ';
+  text.append(field, digits + 1);
+}
+
 // "DD C I " of a core reference: two, one and one hex digits, each followed by a blank.
 void appendRefPrefix(std::string& text, const ZIN_CORE_REF& ref, std::string& scratch) {
-  text += Zin_NumberUtil::uInt2HexStr(ref.deviceIndex, 8, scratch);
-  text += ' ';
-  text += Zin_NumberUtil::uInt2HexStr(ref.userChainNumber, 4, scratch);
-  text += ' ';
-  text += Zin_NumberUtil::uInt2HexStr(ref.coreIndex, 4, scratch);
-  text += ' ';
+  appendField(text, ref.deviceIndex, 8, scratch);
+  appendField(text, ref.userChainNumber, 4, scratch);
+  appendField(text, ref.coreIndex, 4, scratch);
 }
 
 // One line: prefix, code, read flag, bit length, data.
 void appendLine(std::string& text, const ZIN_CORE_REF& ref, uint32_t code, char readFlag,
                 uint32_t bitLength, const std::string& data, std::string& scratch) {
   appendRefPrefix(text, ref, scratch);
-  text += Zin_NumberUtil::uInt2HexStr(code, 8, scratch);
-  text += ' ';
+  appendField(text, code, 8, scratch);
   text += readFlag;
   text += ' ';
-  text += Zin_NumberUtil::uInt2HexStr(bitLength, 32, scratch);
-  text += ' ';
+  appendField(text, bitLength, 32, scratch);
   text += data;
+}
+
+bool sameRef(const ZIN_CORE_REF& a, const ZIN_CORE_REF& b) {
+  return a.deviceIndex == b.deviceIndex && a.userChainNumber == b.userChainNumber &&
+         a.coreIndex == b.coreIndex;
 }
 
 }  // namespace
@@ -55,8 +70,7 @@ void ZinMOX_Command::initFromCoreInfo(const ZINMOX_CORE_INFO& info) {
   moxCoreInfo = info;
   asyncOutValueBits.append(info.async_output_count, '0');
   asyncOutUpdateBits.append(info.async_output_count, '0');
-  syncOutPulseTrains.insert(syncOutPulseTrains.end(), info.sync_output_count,
-                            std::string(STEPS_OF_ZERO));
+  syncOutSteps.append(static_cast<size_t>(info.sync_output_count) * STEP_COUNT, '0');
   syncOutUpdateBits.append(info.sync_output_count, '0');
   for (std::string* field : {&asyncInValueBits, &asyncInActivityUpBits, &asyncInActivityDownBits}) {
     field->append(info.async_input_count, '0');
@@ -70,6 +84,33 @@ void ZinMOX_Command::initFromCoreInfo(const ZINMOX_CORE_INFO& info) {
 void ZinMOX_Command::clearUpdateMasks() {
   asyncOutUpdateBits.assign(asyncOutUpdateBits.size(), '0');
   syncOutUpdateBits.assign(syncOutUpdateBits.size(), '0');
+}
+
+void ZinMOX_Command::setAsyncOutValueBits(const uint8_t* packed, uint32_t count) {
+  Zin_NumberUtil::bin2ReverseBinStr(packed, count, asyncOutValueBits);
+}
+
+void ZinMOX_Command::setAsyncOutUpdateBits(const uint8_t* packed, uint32_t count) {
+  Zin_NumberUtil::bin2ReverseBinStr(packed, count, asyncOutUpdateBits);
+}
+
+void ZinMOX_Command::setSyncOutUpdateBits(const uint8_t* packed, uint32_t count) {
+  Zin_NumberUtil::bin2ReverseBinStr(packed, count, syncOutUpdateBits);
+}
+
+void ZinMOX_Command::stageAsyncRun(uint32_t first, const uint8_t* value, uint32_t n) {
+  char* chars = asyncOutValueBits.data() + first;
+  uint32_t i = 0;
+  for (; i + 8 <= n; i += 8) std::memcpy(chars + i, mox::kByteBitsLsbFirst[value[i / 8]].data(), 8);
+  for (; i < n; ++i) chars[i] = ((value[i / 8] >> (i % 8)) & 1u) != 0 ? '1' : '0';
+  std::memset(asyncOutUpdateBits.data() + first, '1', n);
+}
+
+void ZinMOX_Command::holdPulseTrainRun(uint32_t first, const uint8_t* value, uint32_t n) {
+  for (uint32_t i = 0; i < n; ++i) {
+    holdPulseTrain(first + i, ((value[i / 8] >> (i % 8)) & 1u) != 0 ? '1' : '0');
+  }
+  std::memset(syncOutUpdateBits.data() + first, '1', n);
 }
 
 std::string& ZinMOX_Command::buildCommandText(const ZIN_CORE_REF& coreRef, uint32_t code,
@@ -122,20 +163,24 @@ std::string& ZinMOX_Command::buildCommandText(const ZIN_CORE_REF& coreRef, uint3
 
 bool ZinMOX_Command::appendDataHex(std::string& text, size_t dataBits) const {
   mox::HexTextWriter writer(text, dataBits);
-  if (!writer.add(asyncOutValueBits)) return false;
-  for (const std::string& steps : syncOutPulseTrains) {
-    if (steps.size() != STEP_COUNT || !writer.addSteps(steps.data())) return false;
-  }
-  return writer.add(asyncOutUpdateBits) && writer.add(syncOutUpdateBits) && writer.done();
+  return writer.add(asyncOutValueBits) && writer.add(syncOutSteps) &&
+         writer.add(asyncOutUpdateBits) && writer.add(syncOutUpdateBits) && writer.done();
 }
 
 void ZinMOX_Command::writeOutputs(uint32_t handle, const ZIN_CORE_REF& coreRef) {
   if (moxCoreInfo.async_output_count == 0 && moxCoreInfo.sync_output_count == 0) return;
-  std::string text;
-  std::string commitLine;
+  // The sequence is rendered into storage kept from the last write; the code-02 line depends
+  // only on the reference and is rendered again only when the reference changes.
+  if (!commitLine_.valid || !sameRef(commitLine_.ref, coreRef)) {
+    commitLine_.valid = false;
+    buildCommandText(coreRef, 2, commitLine_.text, nullptr);
+    commitLine_.ref = coreRef;
+    commitLine_.valid = true;
+  }
+  std::string& text = writeText_;
   buildCommandText(coreRef, 1, text, nullptr);
   text += '\n';
-  text += buildCommandText(coreRef, 2, commitLine, nullptr);
+  text += commitLine_.text;
   Zin_CoreComm::commandSequence(handle, text, nullptr, 0, nullptr);
   ZinJtag_target_flush(handle);
 }
@@ -144,15 +189,21 @@ void ZinMOX_Command::readInputs(uint32_t handle, const ZIN_CORE_REF& coreRef) {
   const uint32_t aIn = moxCoreInfo.async_input_count;
   const uint32_t sIn = moxCoreInfo.sync_input_count;
   if (aIn == 0 && sIn == 0) return;
-  std::string text;
-  uint32_t readBits = 0;
-  buildCommandText(coreRef, 3, text, &readBits);
-  Zin_ByteBuffer readData(mox::byteCount(readBits), 0, 0);
-  Zin_CoreComm::commandSequence(handle, text, readData.uPtr(), readBits, nullptr);
+  // The read sequence depends only on the reference and the port widths: rendered again only
+  // when the reference changes.
+  if (!readLines_.valid || !sameRef(readLines_.ref, coreRef)) {
+    readLines_.valid = false;
+    buildCommandText(coreRef, 3, readLines_.text, &readLines_.readBits);
+    readLines_.ref = coreRef;
+    readLines_.valid = true;
+  }
+  const uint32_t readBits = readLines_.readBits;
+  readData_.resize(mox::byteCount(readBits));
+  Zin_CoreComm::commandSequence(handle, readLines_.text, readData_.data(), readBits, nullptr);
 
   const uint32_t inputBits = ASYNC_IN_BITS * aIn + SYNC_IN_BITS * sIn;
-  std::string bits;
-  mox::msbFirstBitText(readData.uPtr(), inputBits, bits);
+  std::string& bits = readBitText_;
+  mox::msbFirstBitText(readData_.data(), inputBits, bits);
   const uint32_t asyncBits = inputBits - SYNC_IN_BITS * sIn;
   if (sIn != 0) unpackSyncInputs(bits.c_str() + asyncBits);
   if (aIn != 0) unpackAsyncInputs(bits.c_str());

@@ -39,17 +39,13 @@ void ZinMOX_Core::setPortBits(uint32_t handle, ZIN_CORE_REF coreRef, const uint8
   checkPortCount(syncOutDataBitCount, moxCoreInfo.sync_output_count, "setPortBits",
                  "syncOutDataBitCount");
   parts->command.clearUpdateMasks();
-  // Each converted string is moved into the image (the image's old string goes), not copied.
-  std::string bits;
+  // Each port string is converted in place: the image keeps its storage from call to call.
   if (asyncOutDataBitCount != 0) {
-    parts->command.setAsyncOutValueBits(
-        std::move(Zin_NumberUtil::bin2ReverseBinStr(asyncOutData, asyncOutDataBitCount, bits)));
-    parts->command.setAsyncOutUpdateBits(std::move(
-        Zin_NumberUtil::bin2ReverseBinStr(asyncOutUpdateMask, asyncOutDataBitCount, bits)));
+    parts->command.setAsyncOutValueBits(asyncOutData, asyncOutDataBitCount);
+    parts->command.setAsyncOutUpdateBits(asyncOutUpdateMask, asyncOutDataBitCount);
   }
   if (syncOutDataBitCount != 0) {
-    parts->command.setSyncOutUpdateBits(
-        std::move(Zin_NumberUtil::bin2ReverseBinStr(syncOutUpdateMask, syncOutDataBitCount, bits)));
+    parts->command.setSyncOutUpdateBits(syncOutUpdateMask, syncOutDataBitCount);
     parts->command.setStepVectors(syncOutData, syncOutDataBitCount);
   }
   parts->command.writeOutputs(handle, coreRef);

@@ -58,7 +58,14 @@ void transposeColumn(uint64_t early, uint64_t late, ColumnSteps& out) {
 
 void ZinMOX_Command::setStepVectors(const uint8_t* vectors, uint32_t count) {
   const uint32_t stepBytes = mox::byteCount(count);
-  std::string* trains = syncOutPulseTrains.data();
+  const uint8_t* steps[STEP_COUNT];
+  for (uint32_t t = 0; t < STEP_COUNT; ++t) steps[t] = vectors + t * stepBytes;
+  stageStepVectors(steps, nullptr, count);
+}
+
+void ZinMOX_Command::stageStepVectors(const uint8_t* const* vectors, const uint32_t* positions,
+                                      uint32_t count) {
+  const uint32_t stepBytes = mox::byteCount(count);
   ColumnSteps column;
   for (uint32_t byte = 0; byte < stepBytes; ++byte) {
     // Byte t of `early` is the column's byte of step t, byte t of `late` that of step 8 + t;
@@ -66,18 +73,14 @@ void ZinMOX_Command::setStepVectors(const uint8_t* vectors, uint32_t count) {
     uint64_t early = 0;
     uint64_t late = 0;
     for (uint32_t t = 0; t < 8; ++t) {
-      early |= uint64_t{vectors[t * stepBytes + byte]} << (8 * t);
-      late |= uint64_t{vectors[(8 + t) * stepBytes + byte]} << (8 * t);
+      early |= uint64_t{vectors[t][byte]} << (8 * t);
+      late |= uint64_t{vectors[8 + t][byte]} << (8 * t);
     }
     transposeColumn(early, late, column);
     const uint32_t outputs = std::min<uint32_t>(8, count - 8 * byte);
-    std::string* train = trains + 8 * byte;
-    for (uint32_t b = 0; b < outputs; ++b, ++train) {
-      if (train->size() == STEP_COUNT) {
-        std::memcpy(train->data(), column.steps[b], STEP_COUNT);
-      } else {
-        train->assign(column.steps[b], STEP_COUNT);
-      }
+    for (uint32_t b = 0; b < outputs; ++b) {
+      const uint32_t bit = 8 * byte + b;
+      setPulseTrainSteps(positions != nullptr ? positions[bit] : bit, column.steps[b]);
     }
   }
 }

@@ -11,6 +11,9 @@
 #include <cstdint>
 #include <cstring>
 #include <string>
+#if defined(__SSE2__)
+#include <emmintrin.h>
+#endif
 
 namespace ZinRT::mox {
 
@@ -72,6 +75,43 @@ inline bool isBitWord(uint64_t word) {
   return (word & 0xFEFEFEFEFEFEFEFEull) == 0x3030303030303030ull;
 }
 
+/// Whether all eight characters of a word are hexadecimal digits of either case.
+inline bool isHexWord(uint64_t word) {
+  constexpr uint64_t ones = 0x0101010101010101ull;
+  constexpr uint64_t high = 0x8080808080808080ull;
+  const uint64_t low = word & ~high;  // seven bits per byte: the sums below carry into no neighbour
+  const auto inRange = [](uint64_t w, uint64_t first, uint64_t last) {
+    return (w + (0x80 - first) * ones) & ~(w + (0x7F - last) * ones) & high;
+  };
+  // Setting bit 5 turns 'A'-'F' into 'a'-'f' and leaves the digits as they are.
+  const uint64_t digits = inRange(low, '0', '9') | inRange(low | 0x2020202020202020ull, 'a', 'f');
+  return (~word & high & digits) == high;
+}
+
+/// Whether all `n` characters of `text` are hexadecimal digits of either case.
+inline bool allHexDigits(const char* text, size_t n) {
+  size_t i = 0;
+#if defined(__SSE2__)
+  // Signed comparisons: a byte of 0x80 or more is below every bound and fails both ranges.
+  for (; n - i >= 16; i += 16) {
+    const __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(text + i));
+    const __m128i folded = _mm_or_si128(v, _mm_set1_epi8(0x20));  // 'A'-'F' become 'a'-'f'
+    const __m128i digit = _mm_and_si128(_mm_cmpgt_epi8(v, _mm_set1_epi8('0' - 1)),
+                                        _mm_cmplt_epi8(v, _mm_set1_epi8('9' + 1)));
+    const __m128i letter = _mm_and_si128(_mm_cmpgt_epi8(folded, _mm_set1_epi8('a' - 1)),
+                                         _mm_cmplt_epi8(folded, _mm_set1_epi8('f' + 1)));
+    if (_mm_movemask_epi8(_mm_or_si128(digit, letter)) != 0xFFFF) return false;
+  }
+#endif
+  for (; n - i >= 8; i += 8) {
+    if (!isHexWord(loadWord(text + i))) return false;
+  }
+  for (; i < n; ++i) {
+    if (hexDigitValue(text[i]) < 0) return false;
+  }
+  return true;
+}
+
 /// The eight bit characters of a word as a byte, the first character most significant.
 inline unsigned bitWordMsbFirst(uint64_t word) {
   return static_cast<unsigned>(((word & 0x0101010101010101ull) * 0x8040201008040201ull) >> 56);
@@ -89,6 +129,49 @@ inline void msbFirstBitText(const unsigned char* data, uint32_t n, std::string& 
   }
   if (rest != 0) std::memcpy(out, kByteBitsMsbFirst[data[whole]].data() + (8 - rest), rest);
 }
+
+/// A byte whose bit k is 1 exactly where character k of `word` is '1' (the first character is
+/// bit 0).
+inline unsigned onesWordLsbFirst(uint64_t word) {
+  const uint64_t diff = word ^ 0x3131313131313131ull;  // zero bytes where the character is '1'
+  const uint64_t low7 = 0x7F7F7F7F7F7F7F7Full;
+  const uint64_t nonZero = (((diff & low7) + low7) | diff) & 0x8080808080808080ull;
+  const uint64_t ones = (~nonZero & 0x8080808080808080ull) >> 7;
+  return static_cast<unsigned>((ones * 0x0102040810204080ull) >> 56);
+}
+
+/// Two bytes whose bit k is 1 exactly where character k of the sixteen at `text` is '1' (the
+/// first character is bit 0).
+inline unsigned onesLsbFirst16(const char* text) {
+#if defined(__SSE2__)
+  const __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(text));
+  return static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(v, _mm_set1_epi8('1'))));
+#else
+  return onesWordLsbFirst(loadWord(text)) | (onesWordLsbFirst(loadWord(text + 8)) << 8);
+#endif
+}
+
+/// The hexadecimal text of the `n` least significant bits of a packed vector (bit i in bit i mod
+/// 8 of byte i/8): ceil(n/4) upper-case digits, most significant first, the bits of the first
+/// digit above bit n-1 taken as zero.
+inline void packedHexText(const unsigned char* data, uint32_t n, std::string& text) {
+  const uint32_t digits = (n + 3) / 4;
+  text.resize(digits);
+  char* end = text.data() + digits;
+  const uint32_t whole = digits / 2;
+  for (uint32_t q = 0; q < whole; ++q) std::memcpy(end - 2 * q - 2, kByteDigits[data[q]].data(), 2);
+  if (digits % 2 != 0) text[0] = kHexDigits[data[whole] & 0x0Fu];
+  if (n % 4 != 0) text[0] = kHexDigits[hexDigitValue(text[0]) & ((1u << (n % 4)) - 1)];
+}
+
+/// Each byte value with its bits in reverse order.
+inline constexpr std::array<uint8_t, 256> kReversedBits = [] {
+  std::array<uint8_t, 256> table{};
+  for (unsigned b = 0; b < 256; ++b) {
+    for (unsigned k = 0; k < 8; ++k) table[b] |= static_cast<uint8_t>(((b >> k) & 1u) << (7 - k));
+  }
+  return table;
+}();
 
 /// Writes, piece by piece, the hexadecimal text of a bit text given in pieces: upper-case
 /// digits, most significant first, the whole bit text padded with zeros on the left to whole
@@ -110,6 +193,18 @@ class HexTextWriter {
     const char* p = bits.data();
     const char* end = p + bits.size();
     if ((pending_ + bits.size()) / 4 > static_cast<size_t>(end_ - next_)) return false;
+#if defined(__SSE2__)
+    for (; end - p >= 16; p += 16) {
+      const __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
+      const __m128i bitChars = _mm_cmpeq_epi8(_mm_and_si128(v, _mm_set1_epi8('\xFE')),
+                                              _mm_set1_epi8('0'));  // '0' and '1' only
+      if (_mm_movemask_epi8(bitChars) != 0xFFFF) return false;
+      const auto ones =
+          static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(v, _mm_set1_epi8('1'))));
+      pushByte(kReversedBits[ones & 0xFF]);  // character k is bit k: the first is the top bit
+      pushByte(kReversedBits[ones >> 8]);
+    }
+#endif
     for (; end - p >= 8; p += 8) {
       const uint64_t word = loadWord(p);
       if (!isBitWord(word)) return false;
@@ -137,7 +232,9 @@ class HexTextWriter {
   }
 
   /// Whether exactly the announced number of bits was added (every digit of the room written).
-  bool done() const { return next_ == end_ && pending_ == 0; }
+  bool done() const {
+    return next_ == end_ && pending_ == 0;
+  }
 
  private:
   // Fewer than four bits are pending: eight new ones complete exactly two digits.

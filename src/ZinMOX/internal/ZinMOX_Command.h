@@ -13,7 +13,8 @@
 
 namespace ZinRT {
 
-/// The image of a core's four ports as '0'/'1' strings (character i is port bit i), and the only
+/// The image of a core's four ports as '0'/'1' strings (character i is port bit i; a synchronous
+/// output bit has a string of 16 step characters, all kept in one block), and the only
 /// place where command text is built and sent. Writers call clearUpdateMasks, stage characters,
 /// then writeOutputs; readers call readInputs, then read characters. Owned by its core (in its
 /// private parts); used under the session's target lock, one thread at a time. Internal.
@@ -43,33 +44,53 @@ class ZinMOX_Command {
   void setAsyncOutValueBits(std::string bits) { asyncOutValueBits = std::move(bits); }
   void setAsyncOutUpdateBits(std::string bits) { asyncOutUpdateBits = std::move(bits); }
   void setSyncOutUpdateBits(std::string bits) { syncOutUpdateBits = std::move(bits); }
+  /// Sets the characters of a whole output string from `count` packed bits (bit i in bit i mod 8
+  /// of byte i/8), in place: the string keeps its storage.
+  void setAsyncOutValueBits(const uint8_t* packed, uint32_t count);
+  void setAsyncOutUpdateBits(const uint8_t* packed, uint32_t count);
+  void setSyncOutUpdateBits(const uint8_t* packed, uint32_t count);
   void setAsyncOutValueChar(uint32_t bit, char c) { asyncOutValueBits[bit] = c; }
   void setAsyncOutUpdateChar(uint32_t bit, char c) { asyncOutUpdateBits[bit] = c; }
   void setSyncOutUpdateChar(uint32_t bit, char c) { syncOutUpdateBits[bit] = c; }
-  void setPulseTrain(uint32_t bit, std::string steps) {
-    syncOutPulseTrains[bit] = std::move(steps);
+  /// Sets the step string of a synchronous output bit. A string of other than STEP_COUNT
+  /// characters is kept as a train the write line refuses (buildCommandText fails), never cut
+  /// or padded into one it would send.
+  void setPulseTrain(uint32_t bit, const std::string& steps) {
+    if (steps.size() == STEP_COUNT) {
+      setPulseTrainSteps(bit, steps.data());
+    } else {
+      holdPulseTrain(bit, UNRENDERABLE_STEP);
+    }
   }
-  void setPulseTrainStep(uint32_t bit, uint32_t step, char c) { syncOutPulseTrains[bit][step] = c; }
+  void setPulseTrainStep(uint32_t bit, uint32_t step, char c) { trainAt(bit)[step] = c; }
   /// Sets the step strings of synchronous outputs 0 to count-1 from 16 packed step vectors
   /// (vector t at byte t*ceil(count/8)): character t of output i's string is bit i of vector t.
   void setStepVectors(const uint8_t* vectors, uint32_t count);
-  /// Holds one level on all steps of a synchronous output bit, without building a step string.
+  /// Sets the step strings of `count` synchronous outputs from 16 packed step vectors given one
+  /// by one (`vectors[t]` is step t, bit i of it for value bit i): character t of the string of
+  /// output positions[i] (of output i when `positions` is null) is bit i of vector t.
+  void stageStepVectors(const uint8_t* const* vectors, const uint32_t* positions, uint32_t count);
+  /// Stages value bits 0 to n-1 of a packed vector on the asynchronous outputs first to
+  /// first+n-1, each with its update mark (a run of consecutive port bits).
+  void stageAsyncRun(uint32_t first, const uint8_t* value, uint32_t n);
+  /// Holds value bits 0 to n-1 of a packed vector on all steps of the synchronous outputs first
+  /// to first+n-1, each with its update mark.
+  void holdPulseTrainRun(uint32_t first, const uint8_t* value, uint32_t n);
+  /// Holds one level on all steps of a synchronous output bit.
   void holdPulseTrain(uint32_t bit, char level) {
-    std::string& steps = syncOutPulseTrains[bit];
-    if (steps.size() == STEP_COUNT) {
-      std::memset(steps.data(), level, STEP_COUNT);
+    static constexpr char LOW[] = "0000000000000000";
+    static constexpr char HIGH[] = "1111111111111111";
+    // A fixed-size copy of one of two constant trains is a single store; other levels (only the
+    // unrenderable mark) are filled.
+    if (level == '0' || level == '1') {
+      std::memcpy(trainAt(bit), level == '1' ? HIGH : LOW, STEP_COUNT);
     } else {
-      steps.assign(STEP_COUNT, level);
+      std::memset(trainAt(bit), level, STEP_COUNT);
     }
   }
   /// Sets all STEP_COUNT step characters of a synchronous output bit from `steps`.
   void setPulseTrainSteps(uint32_t bit, const char* steps) {
-    std::string& train = syncOutPulseTrains[bit];
-    if (train.size() == STEP_COUNT) {
-      std::memcpy(train.data(), steps, STEP_COUNT);
-    } else {
-      train.assign(steps, STEP_COUNT);
-    }
+    std::memcpy(trainAt(bit), steps, STEP_COUNT);
   }
 
   void getAsyncInChars(uint32_t bit, char& value, char& activityUp, char& activityDown) const {
@@ -87,7 +108,18 @@ class ZinMOX_Command {
   }
 
   const std::string& getAsyncOutValueBits() const { return asyncOutValueBits; }
-  const std::vector<std::string>& getSyncOutPulseTrains() const { return syncOutPulseTrains; }
+  /// The step string of synchronous output `bit` (STEP_COUNT characters, step 0 first).
+  std::string getPulseTrain(uint32_t bit) const {
+    return syncOutSteps.substr(static_cast<size_t>(bit) * STEP_COUNT, STEP_COUNT);
+  }
+  /// Copies of every step string, in bit order (for checks; the image keeps them in one block).
+  std::vector<std::string> getSyncOutPulseTrains() const {
+    std::vector<std::string> trains;
+    for (uint32_t bit = 0; bit < moxCoreInfo.sync_output_count; ++bit) {
+      trains.push_back(getPulseTrain(bit));
+    }
+    return trains;
+  }
   const std::string& getAsyncOutUpdateBits() const { return asyncOutUpdateBits; }
   const std::string& getSyncOutUpdateBits() const { return syncOutUpdateBits; }
   const std::string& getAsyncInValueBits() const { return asyncInValueBits; }
@@ -102,12 +134,21 @@ class ZinMOX_Command {
 
  private:
   // Appends the hexadecimal text of D, the output data bits of the write line (`dataBits` of
-  // them), without building D; false when the image holds anything but '0'/'1' or irregular
-  // step strings.
+  // them), without building D; false when the image holds anything but '0'/'1' (a step string
+  // of the wrong length is held as characters that are not).
   bool appendDataHex(std::string& text, size_t dataBits) const;
 
   std::string asyncOutValueBits;
-  std::vector<std::string> syncOutPulseTrains;
+  // A character that is neither '0' nor '1': a step string of another length becomes STEP_COUNT
+  // of them, which the write line refuses.
+  static constexpr char UNRENDERABLE_STEP = '?';
+  char* trainAt(uint32_t bit) {
+    return syncOutSteps.data() + static_cast<size_t>(bit) * STEP_COUNT;
+  }
+
+  // The step strings of all synchronous outputs in one block: output i's at i*STEP_COUNT, so
+  // the block is the sync part of the write line's data as it is.
+  std::string syncOutSteps;
   std::string asyncOutUpdateBits;
   std::string syncOutUpdateBits;
   std::string asyncInValueBits;
@@ -119,6 +160,20 @@ class ZinMOX_Command {
   std::string syncInSyncActivityUpBits;
   std::string syncInSyncActivityDownBits;
   ZINMOX_CORE_INFO moxCoreInfo{};
+
+  // Storage reused from one transfer to the next, so that a transfer on a core of unchanged
+  // size allocates nothing; the lines that depend only on the reference are kept rendered.
+  struct RenderedLines {
+    std::string text;
+    ZIN_CORE_REF ref{};
+    uint32_t readBits = 0;
+    bool valid = false;
+  };
+  RenderedLines commitLine_;
+  RenderedLines readLines_;
+  std::string writeText_;
+  std::vector<unsigned char> readData_;
+  std::string readBitText_;
 };
 
 }  // namespace ZinRT

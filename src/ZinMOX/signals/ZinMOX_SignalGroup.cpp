@@ -3,8 +3,9 @@
 
 #include <stdexcept>
 
-#include "internal/ZinMOX_Command.h"
+#include "format/ZinMOX_BitFormat.h"
 #include "framework/ZinMOX_Framework.h"
+#include "internal/ZinMOX_Command.h"
 
 namespace ZinRT {
 
@@ -17,10 +18,19 @@ inline bool packedBit(const uint8_t* bytes, uint32_t bit) {
 // ORs value bit i into `packed` (skipped when null) wherever the image character of port bit
 // positions[i] is '1'; other characters leave the bit as it was. Eight bits are gathered in a
 // register before each byte is touched.
-void collectBits(const std::string& image, const uint32_t* positions, uint32_t n, uint8_t* packed) {
+void collectBits(const std::string& image, const uint32_t* positions, uint32_t n, uint8_t* packed,
+                 bool contiguous) {
   if (packed == nullptr) return;
   const char* chars = image.data();
   uint32_t i = 0;
+  if (contiguous) {  // positions[i] is positions[0] + i: eight characters at a time
+    const char* run = chars + (n != 0 ? positions[0] : 0);
+    for (; i + 16 <= n; i += 16) {
+      const unsigned ones = mox::onesLsbFirst16(run + i);
+      packed[i / 8] |= static_cast<uint8_t>(ones);
+      packed[i / 8 + 1] |= static_cast<uint8_t>(ones >> 8);
+    }
+  }
   for (; i + 8 <= n; i += 8) {
     unsigned byte = 0;
     for (unsigned k = 0; k < 8; ++k) byte |= (chars[positions[i + k]] == '1' ? 1u : 0u) << k;
@@ -31,6 +41,13 @@ void collectBits(const std::string& image, const uint32_t* positions, uint32_t n
     for (unsigned k = 0; i + k < n; ++k) byte |= (chars[positions[i + k]] == '1' ? 1u : 0u) << k;
     packed[i / 8] |= static_cast<uint8_t>(byte);
   }
+}
+
+// Whether the positions are one run of consecutive port bits.
+bool isContiguous(const uint32_t* positions, uint32_t n) {
+  uint32_t mismatches = 0;
+  for (uint32_t i = 1; i < n; ++i) mismatches += positions[i] != positions[0] + i ? 1u : 0u;
+  return mismatches == 0;
 }
 
 bool isInputType(uint32_t type) {
@@ -77,8 +94,14 @@ void ZinMOX_SignalGroup::setValues(const uint8_t* value, uint32_t byteSize, uint
   if (value == nullptr) throw std::logic_error("Null value for signal: " + getName());
   checkDirection(type, false, getName());
 
+  // A run of consecutive port bits (a bus or a whole port) is staged a byte at a time.
+  const bool run = n != 0 && isContiguous(positions.data(), n);
   if (type == Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_OUTPUT && stepCount <= 1) {
     if (byteSize < bytes) failTooSmall(getName());
+    if (run) {
+      command->holdPulseTrainRun(positions[0], value, n);
+      return;
+    }
     for (uint32_t i = 0; i < n; ++i) {
       command->holdPulseTrain(positions[i], packedBit(value, i) ? '1' : '0');
       command->setSyncOutUpdateChar(positions[i], '1');
@@ -88,16 +111,20 @@ void ZinMOX_SignalGroup::setValues(const uint8_t* value, uint32_t byteSize, uint
       failTooSmall(getName());
     }
     // All 16 steps are written: the last given vector repeats, vectors past 16 are not used.
+    const uint8_t* vectors[ZinMOX_Command::STEP_COUNT];
     const uint8_t* vector = value;
     for (uint32_t step = 0; step < ZinMOX_Command::STEP_COUNT; ++step) {
-      for (uint32_t i = 0; i < n; ++i) {
-        command->setPulseTrainStep(positions[i], step, packedBit(vector, i) ? '1' : '0');
-        command->setSyncOutUpdateChar(positions[i], '1');
-      }
+      vectors[step] = vector;
       if (step + 1 < stepCount) vector += bytes;
     }
+    command->stageStepVectors(vectors, positions.data(), n);
+    for (uint32_t i = 0; i < n; ++i) command->setSyncOutUpdateChar(positions[i], '1');
   } else {
     if (byteSize < bytes) failTooSmall(getName());
+    if (run) {
+      command->stageAsyncRun(positions[0], value, n);
+      return;
+    }
     for (uint32_t i = 0; i < n; ++i) {
       command->setAsyncOutValueChar(positions[i], packedBit(value, i) ? '1' : '0');
       command->setAsyncOutUpdateChar(positions[i], '1');
@@ -115,16 +142,17 @@ void ZinMOX_SignalGroup::getValues(uint8_t* value, uint8_t* activityUp, uint8_t*
   checkDirection(type, true, getName());
 
   const uint32_t* at = positions.data();
+  const bool run = isContiguous(at, n);
   if (type == Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT) {
-    collectBits(command->getSyncInValueBits(), at, n, value);
-    collectBits(command->getSyncInActivityUpBits(), at, n, activityUp);
-    collectBits(command->getSyncInActivityDownBits(), at, n, activityDown);
-    collectBits(command->getSyncInSyncActivityUpBits(), at, n, syncActivityUp);
-    collectBits(command->getSyncInSyncActivityDownBits(), at, n, syncActivityDown);
+    collectBits(command->getSyncInValueBits(), at, n, value, run);
+    collectBits(command->getSyncInActivityUpBits(), at, n, activityUp, run);
+    collectBits(command->getSyncInActivityDownBits(), at, n, activityDown, run);
+    collectBits(command->getSyncInSyncActivityUpBits(), at, n, syncActivityUp, run);
+    collectBits(command->getSyncInSyncActivityDownBits(), at, n, syncActivityDown, run);
   } else {
-    collectBits(command->getAsyncInValueBits(), at, n, value);
-    collectBits(command->getAsyncInActivityUpBits(), at, n, activityUp);
-    collectBits(command->getAsyncInActivityDownBits(), at, n, activityDown);
+    collectBits(command->getAsyncInValueBits(), at, n, value, run);
+    collectBits(command->getAsyncInActivityUpBits(), at, n, activityUp, run);
+    collectBits(command->getAsyncInActivityDownBits(), at, n, activityDown, run);
   }
 }
 

@@ -47,9 +47,7 @@ std::unique_ptr<Zin_ByteBuffer> fitHexString(const char* text, int32_t bitWidth)
     std::memcpy(out, text + (length - digits), digits);
   }
   out[digits] = '\0';
-  for (size_t i = 0; i < digits; ++i) {
-    if (hexDigitValue(out[i]) < 0) failInvalid(text);
-  }
+  if (!allHexDigits(out, digits)) failInvalid(text);
   return fitted;
 }
 

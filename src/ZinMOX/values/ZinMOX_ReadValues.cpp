@@ -2,8 +2,10 @@
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <vector>
 
 #include "ZinMOX/ZinMOX_SignalGroup.h"
+#include "format/ZinMOX_BitFormat.h"
 #include "framework/ZinMOX_Framework.h"
 #include "internal/ZinMOX_CoreParts.h"
 
@@ -17,33 +19,35 @@ bool isSyncInput(const ZinMOX_SignalGroup& group) {
 
 // Stores under `key` the hexadecimal text of the `width`-bit packed vector that starts at byte
 // `start` of `vectors`, reusing the entry's storage when the key is already there.
-void storeText(ZinMOX_ValueMap& map, const std::string& key, const Zin_ByteBuffer& vectors,
-               uint32_t start, uint32_t width) {
-  std::unique_ptr<Zin_ByteBuffer> text(vectors.bin2HexString(start, width));
-  map[key].assign(text->ptr(), text->getSize());
+const std::string& storeText(ZinMOX_ValueMap& map, const std::string& key,
+                             const std::vector<uint8_t>& vectors, uint32_t start, uint32_t width) {
+  std::string& text = map[key];
+  mox::packedHexText(vectors.data() + start, width, text);
+  return text;
 }
 
 // Writes one signal's value and activity texts under its name and suffixed keys.
-void reportSignal(const ZinMOX_SignalGroup& group, ZinMOX_ValueMap& map, std::string& key) {
+void reportSignal(const ZinMOX_SignalGroup& group, ZinMOX_ValueMap& map, std::string& key,
+                  std::vector<uint8_t>& vectors) {
   const uint32_t width = group.size();
   const uint32_t bytes = mox::byteCount(width);
   const bool sync = isSyncInput(group);
   // The five vectors (value, activity up and down, sync activity up and down) lie one after
   // another in one zero-filled buffer.
-  Zin_ByteBuffer vectors((sync ? 5 : 3) * bytes, 0, 0);
-  uint8_t* at = vectors.uPtr();
+  vectors.assign(static_cast<size_t>(sync ? 5 : 3) * bytes, 0);
+  uint8_t* at = vectors.data();
   group.getValues(at, at + bytes, at + 2 * bytes, sync ? at + 3 * bytes : nullptr,
                   sync ? at + 4 * bytes : nullptr, bytes);
 
   const std::string& name = group.getKeyName();
-  storeText(map, name, vectors, 0, width);
+  const std::string& value = storeText(map, name, vectors, 0, width);
   const size_t nameLength = name.size();
   const auto keyOf = [&](const char* suffix) -> const std::string& {
     key.assign(name, 0, nameLength);
     key += suffix;
     return key;
   };
-  map[keyOf(".value")] = map[name];
+  map[keyOf(".value")] = value;  // element references survive the map's growth
   storeText(map, keyOf(".activity_up"), vectors, bytes, width);
   storeText(map, keyOf(".activity_down"), vectors, 2 * bytes, width);
   if (sync) {
@@ -64,8 +68,11 @@ void ZinMOX_Core::readValues(uint32_t handle, ZIN_CORE_REF coreRef, ZinMOX_Value
     throw std::logic_error("ZinMOX_Core::readValues() arg. failed:inputHashMap!=0");
   }
   parts->command.readInputs(handle, coreRef);
-  std::string key;  // the suffixed keys are built in one string
-  for (const auto& entry : parts->inputSignals) reportSignal(*entry.second, *inputHashMap, key);
+  std::string key;               // the suffixed keys are built in one string
+  std::vector<uint8_t> vectors;  // and the packed vectors of every signal in one buffer
+  for (const auto& entry : parts->inputSignals) {
+    reportSignal(*entry.second, *inputHashMap, key, vectors);
+  }
 }
 
 void ZinMOX_Core::readValues(uint32_t handle, ZIN_CORE_REF coreRef,

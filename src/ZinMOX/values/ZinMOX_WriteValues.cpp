@@ -42,7 +42,11 @@ void stageText(ZinMOX_SignalGroup& group, const std::string& text, bool pulseTra
       pulseTrain ? PULSE_TRAIN_BITS_PER_BYTE * mox::byteCount(group.size()) : group.size();
   std::unique_ptr<Zin_ByteBuffer> fitted =
       mox::fitHexString(text.c_str(), static_cast<int32_t>(width));
-  std::unique_ptr<Zin_ByteBuffer> bytes(fitted->hex2Bin(0, fitted->getSize() - 2));
+  // The fitting checked every digit. Of a pulse train only the 16 step vectors in the last
+  // digits are staged, so only those are converted.
+  const uint32_t last = fitted->getSize() - 2;
+  const uint32_t first = pulseTrain ? last + 1 - 2 * BURST_STEPS * mox::byteCount(group.size()) : 0;
+  std::unique_ptr<Zin_ByteBuffer> bytes(fitted->hex2Bin(first, last));
   group.setValues(bytes->uPtr(), bytes->getSize(), pulseTrain ? BURST_STEPS : 1);
 }
 

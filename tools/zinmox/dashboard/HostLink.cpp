@@ -1,23 +1,38 @@
-// The dashboard's calls into the tool's session and host texts. This is the only dashboard
-// file that includes the tool's headers.
+// The dashboard's calls into the tool's session and the host library (ZinHost). This is the
+// only dashboard file that includes their headers.
 #include "HostLink.h"
 
 #include <algorithm>
 #include <cctype>
 #include <set>
 
-#include "../CoreRef.h"
 #include "../Errors.h"
-#include "../Hex.h"
 #include "../InputValues.h"
 #include "../Session.h"
-#include "../Signals.h"
-#include "../TargetOpen.h"
+#include "ZinHost/BitList.h"
+#include "ZinHost/CoreRef.h"
+#include "ZinHost/Signals.h"
+#include "ZinHost/Target.h"
+#include "ZinHost/TextError.h"
+#include "ZinHost/ValueText.h"
 #include "ZinMOX/ZinMOX.h"
 #include "ZinMOX/ZinMOX_CoreInfoFields.h"
 #include "ZinRT/Zin_CoreComm.h"
 
 namespace zinmox::dashboard {
+
+using ZinHost::describeTarget;
+using ZinHost::formatBitList;
+using ZinHost::formatCoreRef;
+using ZinHost::isInput;
+using ZinHost::isReservedName;
+using ZinHost::lowerCase;
+using ZinHost::parseBitList;
+using ZinHost::parseCoreRef;
+using ZinHost::parsePort;
+using ZinHost::Port;
+using ZinHost::portName;
+using ZinHost::portWidth;
 
 namespace {
 
@@ -34,20 +49,6 @@ void checkName(const std::string& name) {
     throw ApiError(
         400, "bad name '" + name + "': use letters, digits and '_', starting with a letter or '_'");
   }
-}
-
-uint32_t infoWidth(const ZINMOX_CORE_INFO& info, Port port) {
-  switch (port) {
-    case Port::AsyncOut:
-      return info.async_output_count;
-    case Port::SyncOut:
-      return info.sync_output_count;
-    case Port::AsyncIn:
-      return info.async_input_count;
-    case Port::SyncIn:
-      return info.sync_input_count;
-  }
-  return 0;
 }
 
 ZINMOX_CORE_INFO infoFromScan(const nlohmann::json& entry) {
@@ -73,7 +74,13 @@ HostLink::~HostLink() {
 void HostLink::rethrow(const std::exception& error) {
   std::string text = error.what();
   for (const std::string& message : messages_) text += (text.empty() ? "" : "; ") + message;
-  if (dynamic_cast<const UsageError*>(&error) != nullptr) throw ApiError(400, text);
+  if (dynamic_cast<const UsageError*>(&error) != nullptr ||
+      dynamic_cast<const ZinHost::TextError*>(&error) != nullptr) {
+    throw ApiError(400, text);
+  }
+  if (const auto* target = dynamic_cast<const ZinHost::TargetError*>(&error)) {
+    throw ApiError(target->kind() == ZinHost::TargetError::Kind::Unusable ? 422 : 502, text);
+  }
   if (dynamic_cast<const Failure*>(&error) != nullptr) {
     throw ApiError(422, text.empty() ? "the target reported a failure" : text);
   }
@@ -164,7 +171,7 @@ nlohmann::json HostLink::coreDetails(const std::string& refText) {
                        {"reserved", false}});
     }
     for (Port port : {Port::AsyncOut, Port::SyncOut, Port::AsyncIn, Port::SyncIn}) {
-      const uint32_t width = infoWidth(widths, port);
+      const uint32_t width = portWidth(widths, port);
       if (width == 0) continue;
       names.push_back({{"name", std::string(portName(port)) + "_data"},
                        {"port", portName(port)},
@@ -183,7 +190,7 @@ void HostLink::define(const std::string& refText, const std::string& name, const
     const std::string ref = moxCoreLocked(refText);
     checkName(name);
     if (isReservedName(name)) throw ApiError(400, name + " is a whole-port name");
-    SignalDefinition signal{name, parsePort(port), parseBitList(bits)};
+    ZinHost::SignalDefinition signal{name, parsePort(port), parseBitList(bits)};
     auto& list = names_[ref];
     const bool input = isInput(signal.port);
     const auto same = std::find_if(list.begin(), list.end(), [&](const Definition& d) {
@@ -246,7 +253,7 @@ void HostLink::write(const std::string& refText,
                          });
       if (!known) throw ApiError(404, "unknown output '" + key + "' on core " + ref);
       if (!seen.insert(name).second) throw ApiError(400, name + " is given more than once");
-      values[key] = cleanHex(text, "the value of " + key);
+      values[key] = ZinHost::hexDigits(text, "the value of " + key);
     }
     ZIN_CORE_REF core = parseCoreRef(ref);
     uintptr_t word = reinterpret_cast<uintptr_t>(&values);

@@ -1,12 +1,12 @@
 // Plain-text tables with aligned columns.
-#ifndef ZINMOX_TOOL_TABLE_H
-#define ZINMOX_TOOL_TABLE_H
+#ifndef ZINHOST_TABLE_H
+#define ZINHOST_TABLE_H
 
 #include <ostream>
 #include <string>
 #include <vector>
 
-namespace zinmox {
+namespace ZinHost {
 
 class Table {
  public:
@@ -20,6 +20,6 @@ class Table {
   std::vector<std::vector<std::string>> rows_;
 };
 
-}  // namespace zinmox
+}  // namespace ZinHost
 
 #endif

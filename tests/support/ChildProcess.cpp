@@ -1,5 +1,5 @@
 // A child process of a test, and loopback socket helpers.
-#include "ChildProcess.h"
+#include "support/ChildProcess.h"
 
 #include <arpa/inet.h>
 #include <fcntl.h>
@@ -11,13 +11,17 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <chrono>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
 #include <stdexcept>
 #include <thread>
 
 extern char** environ;
 
-namespace ZinRtlTest {
+namespace ZinTest {
 
 namespace {
 
@@ -36,7 +40,80 @@ sockaddr_in loopback(int port) {
   return address;
 }
 
+// A folder of this test process, removed when the process ends.
+class TempFolder {
+ public:
+  TempFolder() {
+    std::string pattern = (std::filesystem::temp_directory_path() / "zinmox_test_XXXXXX").string();
+    if (mkdtemp(pattern.data()) == nullptr) throw std::runtime_error("mkdtemp failed");
+    path_ = pattern;
+  }
+  ~TempFolder() {
+    std::error_code ignored;
+    std::filesystem::remove_all(path_, ignored);
+  }
+  const std::filesystem::path& path() const { return path_; }
+
+ private:
+  std::filesystem::path path_;
+};
+
+const std::filesystem::path& tempFolder() {
+  static const TempFolder folder;
+  return folder.path();
+}
+
+std::string readFile(const std::string& path) {
+  std::ifstream file(path, std::ios::binary);
+  std::ostringstream text;
+  text << file.rdbuf();
+  return text.str();
+}
+
 }  // namespace
+
+std::string writeTempFile(const std::string& name, const std::string& text) {
+  const std::string path = (tempFolder() / name).string();
+  std::ofstream(path, std::ios::binary) << text;
+  return path;
+}
+
+ProcessResult runProcess(const std::string& path, const std::vector<std::string>& args,
+                         const std::string& input, int timeoutMs) {
+  static std::atomic<int> counter{0};
+  const std::string id = std::to_string(getpid()) + "_" + std::to_string(++counter);
+  const std::string in = writeTempFile("in_" + id, input);
+  const std::string out = (tempFolder() / ("out_" + id)).string();
+  const std::string err = (tempFolder() / ("err_" + id)).string();
+  std::vector<char*> argv{const_cast<char*>(path.c_str())};
+  for (const std::string& arg : args) argv.push_back(const_cast<char*>(arg.c_str()));
+  argv.push_back(nullptr);
+  posix_spawn_file_actions_t actions;
+  posix_spawn_file_actions_init(&actions);
+  posix_spawn_file_actions_addopen(&actions, 0, in.c_str(), O_RDONLY, 0);
+  posix_spawn_file_actions_addopen(&actions, 1, out.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
+  posix_spawn_file_actions_addopen(&actions, 2, err.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
+  pid_t pid = -1;
+  const int rc = posix_spawn(&pid, path.c_str(), &actions, nullptr, argv.data(), environ);
+  posix_spawn_file_actions_destroy(&actions);
+  if (rc != 0) throw std::runtime_error("cannot start " + path);
+  const auto end = Clock::now() + std::chrono::milliseconds(timeoutMs);
+  int status = 0;
+  while (waitpid(pid, &status, WNOHANG) == 0) {
+    if (msLeft(end) == 0) {
+      kill(pid, SIGKILL);
+      waitpid(pid, &status, 0);
+      break;
+    }
+    std::this_thread::sleep_for(std::chrono::milliseconds(5));
+  }
+  ProcessResult result;
+  if (WIFEXITED(status)) result.status = WEXITSTATUS(status);
+  if (WIFSIGNALED(status)) result.signal = WTERMSIG(status);
+  result.out = readFile(out);
+  result.err = readFile(err);
+  return result;
+}
 
 ChildProcess::ChildProcess(const std::string& path, const std::vector<std::string>& args) {
   int fds[2];
@@ -84,6 +161,16 @@ bool ChildProcess::waitForOutput(const std::string& text, int timeoutMs) {
   return true;
 }
 
+std::string ChildProcess::waitForMatch(const std::regex& pattern, int timeoutMs) {
+  const auto end = Clock::now() + std::chrono::milliseconds(timeoutMs);
+  std::smatch match;
+  while (!std::regex_search(output_, match, pattern)) {
+    if (msLeft(end) == 0) return "";
+    drain(msLeft(end));
+  }
+  return match.size() > 1 ? match[1].str() : match[0].str();
+}
+
 void ChildProcess::signal(int number) {
   if (pid_ > 0) kill(pid_, number);
 }
@@ -127,4 +214,4 @@ int connectLoopback(int port, int timeoutMs) {
   }
 }
 
-}  // namespace ZinRtlTest
+}  // namespace ZinTest

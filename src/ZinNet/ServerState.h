@@ -1,7 +1,7 @@
 // What the connections of a server share: the served transport, its request mutex, the options,
 // the log and the counters.
-#ifndef ZINNET_SRC_SERVERCORE_H
-#define ZINNET_SRC_SERVERCORE_H
+#ifndef ZINNET_SRC_SERVERSTATE_H
+#define ZINNET_SRC_SERVERSTATE_H
 
 #include <atomic>
 #include <memory>
@@ -9,12 +9,13 @@
 #include <string>
 
 #include "Asio.h"
+#include "RequestQueue.h"
 #include "ZinNet/Server.h"
 
 namespace ZinNet {
 
-struct ServerCore {
-  ServerCore(std::shared_ptr<ZinRT::Zin_Transport> t, ServerOptions o)
+struct ServerState {
+  ServerState(std::shared_ptr<ZinRT::Zin_Transport> t, ServerOptions o)
       : transport(std::move(t)), options(std::move(o)) {}
 
   void log(const std::string& line);
@@ -23,6 +24,7 @@ struct ServerCore {
   std::shared_ptr<ZinRT::Zin_Transport> transport;
   const ServerOptions options;
   std::mutex requestMutex;  // held for each request carried out on the transport
+  RequestQueue waiting;     // requests handed to the request thread, not yet begun
   std::mutex logMutex;
   std::atomic<bool> stopping{false};
   std::atomic<uint64_t> connectionsAccepted{0};

@@ -1,11 +1,11 @@
 // The server's log and counters.
-#include "ServerCore.h"
+#include "ServerState.h"
 
 #include <iostream>
 
 namespace ZinNet {
 
-void ServerCore::log(const std::string& line) {
+void ServerState::log(const std::string& line) {
   std::lock_guard<std::mutex> lock(logMutex);
   if (options.log) {
     try {
@@ -18,7 +18,7 @@ void ServerCore::log(const std::string& line) {
   std::cerr << "ZinNet: " << line << std::endl;
 }
 
-ServerStats ServerCore::snapshot() const {
+ServerStats ServerState::snapshot() const {
   ServerStats stats;
   stats.connectionsAccepted = connectionsAccepted.load();
   stats.connectionsOpen = connectionsOpen.load();

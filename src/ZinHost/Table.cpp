@@ -1,9 +1,9 @@
 // Printing tables.
-#include "Table.h"
+#include "ZinHost/Table.h"
 
 #include <algorithm>
 
-namespace zinmox {
+namespace ZinHost {
 
 namespace {
 
@@ -34,4 +34,4 @@ void Table::print(std::ostream& out) const {
   for (const auto& row : rows_) printLine(out, row, widths);
 }
 
-}  // namespace zinmox
+}  // namespace ZinHost
