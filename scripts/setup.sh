@@ -4,7 +4,8 @@
 set -euo pipefail
 packages=(cmake g++ make pkg-config googletest libgtest-dev libgmock-dev libbenchmark-dev
   libcli11-dev nlohmann-json3-dev libasio-dev python3 python3-dev python3-pybind11 pybind11-dev
-  python3-pytest clang-format help2man dpkg-dev
+  python3-pytest clang-format help2man dpkg-dev libcpp-httplib-dev
+  chromium chromium-driver python3-selenium gtkwave
   verilator yosys nextpnr-ice40 fpga-icestorm openocd)
 # The libFuzzer targets (scripts/fuzz.sh) also need clang and its fuzzing runtime.
 if [ "${1:-}" = "fuzz" ]; then

@@ -14,7 +14,7 @@ using Registration = void (*)(CLI::App&, Session&);
 const Registration kSubcommands[] = {
     addScanCommand,  addInfoCommand, addDefineCommand, addUndefineCommand,
     addWriteCommand, addReadCommand, addWatchCommand,  addPortsCommand,
-    addRunCommand,   addDemoCommand, addServeCommand,
+    addRunCommand,   addDemoCommand, addServeCommand,  addDashboardCommand,
 };
 
 }  // namespace

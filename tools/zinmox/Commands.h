@@ -28,6 +28,7 @@ void addPortsCommand(CLI::App& app, Session& session);
 void addRunCommand(CLI::App& app, Session& session);
 void addDemoCommand(CLI::App& app, Session& session);
 void addServeCommand(CLI::App& app, Session& session);
+void addDashboardCommand(CLI::App& app, Session& session);
 
 }  // namespace zinmox
 

@@ -80,6 +80,12 @@ void Session::onMessage(void* user, uint32_t, uint32_t code, const char* text) {
     std::cerr << "zinmox: message (code " << code << "): " << text << "\n";
   }
   std::cerr.flush();
+  if (self->observer_) self->observer_(code, text);
+}
+
+void Session::setMessageObserver(
+    std::function<void(uint32_t code, const std::string& text)> observer) {
+  observer_ = std::move(observer);
 }
 
 std::vector<ZIN_CORE_REF> Session::listCores() {

@@ -4,6 +4,7 @@
 #define ZINMOX_TOOL_SESSION_H
 
 #include <cstdint>
+#include <functional>
 #include <map>
 #include <memory>
 #include <optional>
@@ -33,6 +34,10 @@ class Session {
   uint32_t handle();
   /// The cores where a status read answers, in reference order.
   std::vector<ZIN_CORE_REF> listCores();
+
+  /// Hands every later session message to `observer` as well (after it is printed); an empty
+  /// function stops that. Clients that report failures elsewhere (the dashboard) collect them so.
+  void setMessageObserver(std::function<void(uint32_t code, const std::string& text)> observer);
 
   /// Turns the return code of an exported call into a Failure; the session's messages have
   /// already been printed by then (`what` is printed only if none were).
@@ -73,6 +78,7 @@ class Session {
   uint64_t messageCount_ = 0;
   uint64_t checkedCount_ = 0;  // messageCount_ at the last check
   bool inScript_ = false;
+  std::function<void(uint32_t, const std::string&)> observer_;
   std::map<uint32_t, CoreState> cores_;  // by packed reference
 };
 

@@ -2,13 +2,17 @@
 // mark changes and activity as they happen. Stops after N reads or on Ctrl-C.
 #include <algorithm>
 #include <chrono>
+#include <fstream>
 #include <iomanip>
 #include <iostream>
+#include <memory>
 
 #include "Commands.h"
 #include "CoreArgs.h"
+#include "Errors.h"
 #include "InputValues.h"
 #include "Interrupt.h"
+#include "dashboard/Vcd.h"
 
 namespace zinmox {
 
@@ -19,6 +23,39 @@ struct WatchArgs {
   std::vector<std::string> names;
   uint32_t intervalMs = 500;
   uint64_t count = 0;
+  std::string vcdFile;
+};
+
+std::vector<dashboard::Reading> toReadings(const std::vector<InputValue>& inputs) {
+  std::vector<dashboard::Reading> readings;
+  for (const InputValue& in : inputs) {
+    readings.push_back({in.name, in.width, in.sync, in.value, in.activityUp, in.activityDown,
+                        in.syncActivityUp, in.syncActivityDown});
+  }
+  return readings;
+}
+
+// The value-change dump of --vcd FILE: opened before the first read, one sample per read.
+class VcdFile {
+ public:
+  VcdFile(const std::string& path, const std::string& core) : path_(path), core_(core) {
+    if (path.empty()) return;
+    out_.open(path, std::ios::out | std::ios::trunc);
+    if (!out_) throw Failure("cannot write the waveform file " + path);
+  }
+  void sample(std::chrono::microseconds time, const std::vector<InputValue>& inputs) {
+    if (!out_.is_open()) return;
+    const std::vector<dashboard::Reading> readings = toReadings(inputs);
+    if (!writer_) writer_ = std::make_unique<dashboard::VcdWriter>(out_, "core_" + core_, readings);
+    writer_->sample(static_cast<uint64_t>(time.count()), readings);
+    out_.flush();
+    if (!out_) throw Failure("writing the waveform file " + path_ + " failed");
+  }
+
+ private:
+  std::string path_, core_;
+  std::ofstream out_;
+  std::unique_ptr<dashboard::VcdWriter> writer_;
 };
 
 bool anySet(const std::string& a, const std::string& b) {
@@ -47,6 +84,7 @@ void printRow(const std::vector<std::string>& cells, const std::vector<size_t>& 
 
 void watch(Session& session, const WatchArgs& args) {
   const ZIN_CORE_REF ref = prepareCore(session, args.core);
+  VcdFile vcd(args.vcdFile, args.core.ref);
   InterruptGuard guard;
   const auto start = std::chrono::steady_clock::now();
   std::vector<InputValue> previous;
@@ -58,8 +96,10 @@ void watch(Session& session, const WatchArgs& args) {
   while (!guard.interrupted() && (args.count == 0 || reads < args.count)) {
     if (reads > 0 && guard.sleepFor(std::chrono::milliseconds(args.intervalMs))) break;
     const std::vector<InputValue> inputs = readInputValues(session, ref, args.names);
-    const auto elapsed = std::chrono::duration_cast<std::chrono::milliseconds>(
+    const auto sinceStart = std::chrono::duration_cast<std::chrono::microseconds>(
         std::chrono::steady_clock::now() - start);
+    const auto elapsed = std::chrono::duration_cast<std::chrono::milliseconds>(sinceStart);
+    vcd.sample(sinceStart, inputs);
     std::vector<std::string> cells{std::to_string(++reads), std::to_string(elapsed.count())};
     for (size_t i = 0; i < inputs.size(); ++i) {
       cells.push_back(cell(inputs[i], previous.empty() ? nullptr : &previous[i]));
@@ -100,6 +140,11 @@ void addWatchCommand(CLI::App& app, Session& session) {
   command->add_option("--count", args->count, "stop after N reads (default: until Ctrl-C)")
       ->type_name("N")
       ->check(notNegative);
+  command
+      ->add_option("--vcd", args->vcdFile,
+                   "also write the reads to FILE as a value-change dump: each input and its "
+                   "activity flags as signals, time in microseconds")
+      ->type_name("FILE");
   addSignalsOption(*command, args->core);
   command->footer(
       "Marks after a value: * changed since the previous read, ^ rising activity, "

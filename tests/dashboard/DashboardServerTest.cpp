@@ -1,0 +1,149 @@
+// The dashboard in this process, on a simulated target served over TCP so that the test can see
+// every transfer in the target's command log.
+#include <gtest/gtest.h>
+#include <httplib.h>
+
+#include <algorithm>
+#include <atomic>
+#include <chrono>
+#include <cmath>
+#include <memory>
+#include <sstream>
+#include <thread>
+
+#include "Session.h"
+#include "ZinNet/Server.h"
+#include "ZinSim/Target.h"
+#include "dashboard/Api.h"
+#include "dashboard/HostLink.h"
+#include "dashboard/Server.h"
+
+namespace {
+
+using namespace std::chrono_literals;
+namespace dash = zinmox::dashboard;
+
+// Input reads in the log: sequences with a code-03 line ("DD C K 03 1 LLLLLLLL DATA").
+size_t readsIn(const std::vector<std::string>& log) {
+  size_t reads = 0;
+  for (const std::string& sequence : log) {
+    std::istringstream lines(sequence);
+    for (std::string line; std::getline(lines, line);) {
+      std::istringstream fields(line);
+      std::string device, chain, core, code;
+      if (fields >> device >> chain >> core >> code && code == "03") {
+        ++reads;
+        break;
+      }
+    }
+  }
+  return reads;
+}
+
+// A page following the event stream on its own connection until it is told to stop.
+class Follower {
+ public:
+  explicit Follower(uint16_t port)
+      : thread_([this, port] {
+          httplib::Client client("127.0.0.1", port);
+          client.set_read_timeout(5, 0);
+          client.Get("/api/events", [this](const char* data, size_t size) {
+            if (std::string(data, size).rfind("data:", 0) == 0) ++events_;
+            return !stop_;
+          });
+        }) {}
+  ~Follower() {
+    stop_ = true;
+    thread_.join();
+  }
+  int events() const { return events_; }
+
+ private:
+  std::atomic<int> events_{0};
+  std::atomic<bool> stop_{false};
+  std::thread thread_;
+};
+
+class DashboardServerTest : public ::testing::Test {
+ protected:
+  void SetUp() override {
+    ZinNet::ServerOptions options;
+    options.log = [](const std::string&) {};
+    net_ = std::make_unique<ZinNet::Server>(target_, options);
+    net_->start();
+    session_ = std::make_unique<zinmox::Session>("tcp://" + net_->address());
+    host_ = std::make_unique<dash::HostLink>(*session_);
+    server_ = std::make_unique<dash::Server>(*host_, "127.0.0.1", 0);
+    server_->start();
+  }
+  void TearDown() override {
+    server_.reset();
+    host_.reset();
+    session_.reset();
+    net_.reset();
+  }
+
+  static bool waitFor(const std::function<bool()>& condition) {
+    for (auto end = std::chrono::steady_clock::now() + 10s; std::chrono::steady_clock::now() < end;
+         std::this_thread::sleep_for(10ms)) {
+      if (condition()) return true;
+    }
+    return condition();
+  }
+
+  std::shared_ptr<ZinSim::Target> target_ = std::make_shared<ZinSim::Target>();
+  std::unique_ptr<ZinNet::Server> net_;
+  std::unique_ptr<zinmox::Session> session_;
+  std::unique_ptr<dash::HostLink> host_;
+  std::unique_ptr<dash::Server> server_;
+};
+
+TEST_F(DashboardServerTest, EveryOpenPageSharesOneReadPerInterval) {
+  server_->hub().configure("0:1:0", 20.0, false);
+  std::vector<std::unique_ptr<Follower>> pages;
+  for (size_t i = 0; i < dash::kMaxLiveViews; ++i) {
+    pages.push_back(std::make_unique<Follower>(server_->port()));
+  }
+  ASSERT_TRUE(waitFor([&] {
+    return std::all_of(pages.begin(), pages.end(), [](auto& p) { return p->events() > 0; });
+  }));
+  // One page more than the limit is turned away; the others go on.
+  httplib::Client extra("127.0.0.1", server_->port());
+  const auto refused = extra.Get("/api/events");
+  ASSERT_TRUE(refused);
+  EXPECT_EQ(refused->status, 503);
+
+  target_->clearCommandLog();
+  const auto start = std::chrono::steady_clock::now();
+  std::vector<int> before;
+  for (auto& page : pages) before.push_back(page->events());
+  std::this_thread::sleep_for(1s);
+  const size_t reads = readsIn(target_->commandLog());
+  const double seconds =
+      std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
+  EXPECT_LE(reads, static_cast<size_t>(seconds * 20) + 1);  // one read per 50 ms at most
+  EXPECT_GE(reads, 10u);                                    // and the reads do go on
+  for (size_t i = 0; i < pages.size(); ++i) EXPECT_GE(pages[i]->events() - before[i], 8);
+}
+
+TEST_F(DashboardServerTest, LiveSettingsRefuseRatesOutOfBoundsAndMissingCores) {
+  const struct {
+    std::optional<std::string> core;
+    std::optional<double> rate;
+    int status;
+  } cases[] = {{std::nullopt, 0.99, 400},    {std::nullopt, 50.01, 400}, {std::nullopt, NAN, 400},
+               {"0:1:3", std::nullopt, 404},  // a core of another type
+               {"0:2:0", std::nullopt, 404}, {"0:1", std::nullopt, 400}};
+  for (const auto& c : cases) {
+    try {
+      server_->hub().configure(c.core, c.rate, std::nullopt);
+      ADD_FAILURE() << "accepted " << c.core.value_or("-") << " at " << c.rate.value_or(0);
+    } catch (const dash::ApiError& error) {
+      EXPECT_EQ(error.status(), c.status) << error.what();
+    }
+  }
+  EXPECT_EQ(server_->hub().configure("0x0:1:0x1", 1.0, true).core, "0:1:1");
+  EXPECT_EQ(server_->hub().configure(std::nullopt, 50.0, std::nullopt).rateHz, 50.0);
+}
+
+}  // namespace
