@@ -1,5 +1,5 @@
-// The host side of the hub protocol (docs/hub-protocol.md) over a PinBench: request headers,
-// the capture word, CRC-16, status records, stage images and capture read-outs.
+// The host side of the hub protocol (docs/hub-protocol.md) over a PinBench, built on ZinHub's
+// codec and CRC: status records, stage images, request replies and capture read-outs.
 #pragma once
 
 #include <algorithm>
@@ -10,43 +10,22 @@
 #include <vector>
 
 #include "PinBench.h"
+#include "ZinHub/Crc16.h"
+#include "ZinHub/HubCodec.h"
 
 namespace RtlTest {
 
 enum Op : uint32_t { kHubInfo = 0, kStage = 1, kCommit = 2, kCapture = 3, kClear = 4, kStatus = 5 };
 
-inline void appendNumber(Bits& bits, uint64_t value, int length) {
-  for (int i = 0; i < length; ++i) bits.push_back((value >> i) & 1u);
-}
+using ZinHub::appendCrc;
+using ZinHub::appendNumber;
+using ZinHub::crc16;
+using CaptureWord = ZinHub::CaptureWord;
 inline uint64_t number(const Bits& bits, size_t first, size_t length) {
-  uint64_t v = 0;
-  for (size_t i = 0; i < length; ++i) v |= uint64_t{bits.at(first + i)} << i;
-  return v;
-}
-
-// CRC-16 register (0x1021, initial 0xFFFF) after feeding bits in order.
-inline uint16_t crc16(const Bits& bits, size_t first, size_t length) {
-  uint16_t crc = 0xFFFF;
-  for (size_t i = first; i < first + length; ++i) {
-    const bool feedback = ((crc >> 15) & 1u) != bits.at(i);
-    crc = static_cast<uint16_t>((crc << 1) ^ (feedback ? 0x1021 : 0));
-  }
-  return crc;
-}
-inline void appendCrc(Bits& bits, uint16_t crc) {
-  for (int i = 15; i >= 0; --i) bits.push_back((crc >> i) & 1u);
+  return ZinHub::readNumber(bits, first, static_cast<unsigned>(length));
 }
 inline bool crcOk(const Bits& bits, size_t first, size_t length) {
   return crc16(bits, first, length + 16) == 0;
-}
-
-struct CaptureWord {
-  uint32_t pattern, version;
-  bool busy, stageBad;
-};
-inline CaptureWord decodeCaptureWord(const Bits& out) {
-  return {static_cast<uint32_t>(number(out, 0, 8)), static_cast<uint32_t>(number(out, 8, 4)),
-          out.at(12) != 0, out.at(13) != 0};
 }
 
 // An output image for a stage scan.
@@ -84,11 +63,9 @@ class HubClient {
  public:
   HubClient(Bench& bench, uint32_t waitBits = 64) : bench_(bench), wait_(waitBits) {}
 
-  static Bits header(uint32_t op, uint32_t core, uint32_t key = 0xA5) {
+  static Bits header(uint32_t op, uint32_t core) {
     Bits h;
-    appendNumber(h, op, 4);
-    appendNumber(h, core, 4);
-    appendNumber(h, key, 8);
+    ZinHub::appendHeader(h, static_cast<ZinHub::HubOp>(op), core);
     return h;
   }
 
@@ -97,7 +74,7 @@ class HubClient {
     Bits in = header(op, core);
     in.insert(in.end(), payload.begin(), payload.end());
     Bits out = bench_.dr(in, stopAfter);
-    last_ = decodeCaptureWord(out);
+    last_ = ZinHub::parseCaptureWord(out);
     return out;
   }
   const CaptureWord& lastCaptureWord() const { return last_; }
