@@ -128,16 +128,15 @@ TEST_F(DemoHub, BrokenStageIsRefusedAndBusyStopsCommands) {
   EXPECT_FALSE(hub_.lastCaptureWord().stagedInvalid);
 
   // One flipped bit: the CRC fails, the next scan reports it and a commit refuses.
-  Bits payload = stageNumber(fullImage(kCores[1], rng));
-  appendCrc(payload, crc16(payload, 0, payload.size()));
-  payload[5] ^= 1;
-  hub_.scan(kStage, 1, payload);
+  Bits payload = Client::stageScan(1, fullImage(kCores[1], rng));
+  payload[21] ^= 1;
+  hub_.raw(payload);
   EXPECT_EQ(hub_.result(kCommit, 1), 2);
   EXPECT_TRUE(hub_.lastCaptureWord().stagedInvalid);
   // A stage one bit too long fails too.
-  payload[5] ^= 1;
+  payload[21] ^= 1;
   payload.push_back(0);
-  hub_.scan(kStage, 1, payload);
+  hub_.raw(payload);
   EXPECT_EQ(hub_.result(kCommit, 1), 2);
   // Commands to the status-only core are no operations: no start bit.
   EXPECT_EQ(hub_.result(kClear, 3), -1);
@@ -156,9 +155,8 @@ TEST_F(DemoHub, ResetInTheMiddleOfAScan) {
   ASSERT_EQ(hub_.result(kCommit, 1), 1);
 
   // TRST in the middle of a stage scan: the image is invalid, a commit refuses.
-  Bits payload = stageNumber(fullImage(kCores[1], rng));
-  appendCrc(payload, crc16(payload, 0, payload.size()));
-  hub_.scan(kStage, 1, payload, 40);
+  const Bits payload = Client::stageScan(1, fullImage(kCores[1], rng));
+  hub_.raw(payload, 56);
   bench_.pulseTrst();
   bench_.ir(kUser1);
   EXPECT_EQ(hub_.result(kCommit, 1), 2);
@@ -174,7 +172,7 @@ TEST_F(DemoHub, ResetInTheMiddleOfAScan) {
   for (int i = 0; i < 8; ++i) EXPECT_EQ(in[i].value, first.asyncValue[i]);
 
   // TMS reset (five ones) cuts a stage scan short through Update-DR.
-  hub_.scan(kStage, 1, payload, 60);
+  hub_.raw(payload, 76);
   bench_.resetTap();
   bench_.ir(kUser1);
   EXPECT_EQ(hub_.result(kCommit, 1), 2);

@@ -17,7 +17,6 @@ namespace RtlTest {
 
 enum Op : uint32_t { kHubInfo = 0, kStage = 1, kCommit = 2, kCapture = 3, kClear = 4, kStatus = 5 };
 
-using ZinHub::appendCrc;
 using ZinHub::appendNumber;
 using ZinHub::crc16;
 using CaptureWord = ZinHub::CaptureWord;
@@ -69,13 +68,16 @@ class HubClient {
     return h;
   }
 
-  // One DR scan: header plus payload; returns everything TDO gave.
-  Bits scan(uint32_t op, uint32_t core, const Bits& payload, size_t stopAfter = SIZE_MAX) {
-    Bits in = header(op, core);
-    in.insert(in.end(), payload.begin(), payload.end());
+  // One DR scan of the given TDI bits; returns everything TDO gave.
+  Bits raw(const Bits& in, size_t stopAfter = SIZE_MAX) {
     Bits out = bench_.dr(in, stopAfter);
     last_ = ZinHub::parseCaptureWord(out);
     return out;
+  }
+  Bits scan(uint32_t op, uint32_t core, const Bits& payload, size_t stopAfter = SIZE_MAX) {
+    Bits in = header(op, core);
+    in.insert(in.end(), payload.begin(), payload.end());
+    return raw(in, stopAfter);
   }
   const CaptureWord& lastCaptureWord() const { return last_; }
 
@@ -86,21 +88,19 @@ class HubClient {
     return Bits(out.begin() + 16, out.begin() + 16 + static_cast<long>(length));
   }
 
-  void stage(uint32_t core, const Image& image) {
-    Bits payload = stageNumber(image);
-    appendCrc(payload, crc16(payload, 0, payload.size()));
-    scan(kStage, core, payload);
+  // A stage scan's TDI: header, the image's number and its CRC.
+  static Bits stageScan(uint32_t core, const Image& image) {
+    return ZinHub::stageRequest(core, stageNumber(image));
   }
+  void stage(uint32_t core, const Image& image) { raw(stageScan(core, image)); }
 
   // A request op: returns the reply bits after the start bit, or nothing without a start bit.
   std::optional<Bits> request(uint32_t op, uint32_t core, size_t replyLength) {
     const Bits out = scan(op, core, Bits(wait_ + 1 + replyLength, 0));
-    for (size_t i = 16; i <= 16 + wait_; ++i) {
-      if (out[i])
-        return Bits(out.begin() + static_cast<long>(i) + 1,
-                    out.begin() + static_cast<long>(i + 1 + replyLength));
-    }
-    return std::nullopt;
+    const auto at = ZinHub::findReply(out, static_cast<unsigned>(wait_));
+    if (!at) return std::nullopt;
+    return Bits(out.begin() + static_cast<long>(*at),
+                out.begin() + static_cast<long>(*at + replyLength));
   }
   // Commit or clear: the 8-bit result (bit 0 done, bit 1 refused), -1 without an answer.
   int result(uint32_t op, uint32_t core) {
