@@ -5,6 +5,9 @@ the logger "zinmox"."""
 import os
 from typing import Any, Literal, Mapping, Sequence, overload
 
+__version__: str
+"""The version of the libZinMOX build this module belongs to, "MAJOR.MINOR.PATCH"."""
+
 CoreRef = tuple[int, int, int] | list[int] | str
 """A (device, chain, core) tuple or a "D:C:I" text; numbers decimal or 0x hex."""
 

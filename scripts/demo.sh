@@ -1,10 +1,11 @@
 #!/usr/bin/env bash
-# Builds the project if needed and runs the guided tour on the built-in simulated demo design.
+# Builds the tool if needed (the plain build in build/) and runs the guided tour on the built-in
+# simulated demo design.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 scripts/setup.sh
-if [ ! -x build/default/bin/zinmox ]; then
-  cmake --preset default >/dev/null
-  cmake --build --preset default --target zinmox
+if [ ! -x build/bin/zinmox ]; then
+  cmake -S . -B build >/dev/null
+  cmake --build build -j2 --target zinmox
 fi
-exec build/default/bin/zinmox demo "$@"
+exec build/bin/zinmox demo "$@"

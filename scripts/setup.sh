@@ -1,9 +1,10 @@
 #!/usr/bin/env bash
-# Installs, from Debian packages, whatever the build and the tests need and the machine lacks.
+# Installs, from Debian packages, whatever the build and the tests need and the machine lacks
+# (help2man writes the tool's manual page, dpkg-dev makes and checks the Debian packages).
 set -euo pipefail
 packages=(cmake g++ make pkg-config googletest libgtest-dev libgmock-dev libbenchmark-dev
   libcli11-dev nlohmann-json3-dev libasio-dev python3 python3-dev python3-pybind11 pybind11-dev
-  python3-pytest clang-format
+  python3-pytest clang-format help2man dpkg-dev
   verilator yosys nextpnr-ice40 fpga-icestorm openocd)
 # The libFuzzer targets (scripts/fuzz.sh) also need clang and its fuzzing runtime.
 if [ "${1:-}" = "fuzz" ]; then

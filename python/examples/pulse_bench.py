@@ -5,7 +5,7 @@ Names a control bus and a clocked output, drives them, and reads them back throu
 design's loopback: values, a 16-step pulse train seen cycle by cycle, and activity.
 
 Run from the repository root after building:
-    PYTHONPATH=build/default/python /usr/bin/python3 python/examples/pulse_bench.py
+    PYTHONPATH=build/python /usr/bin/python3 python/examples/pulse_bench.py
 """
 
 import logging

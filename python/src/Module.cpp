@@ -7,6 +7,7 @@
 #include "Session.h"
 #include "SimTarget.h"
 #include "Values.h"
+#include "ZinMOX/ZinMOX_Version.h"
 
 PYBIND11_MODULE(zinmox, module) {
   module.doc() =
@@ -18,6 +19,7 @@ PYBIND11_MODULE(zinmox, module) {
       "        core.write(ctl=0x3F)\n"
       "        print(core.read()[\"async_in_data\"].value)\n\n"
       "Failures raise zinmox.Error; other session messages go to the logger \"zinmox\".";
+  module.attr("__version__") = ZINMOX_VERSION_STRING;
   zinmox::bindErrors(module);
   zinmox::bindValues(module);
   zinmox::bindPorts(module);

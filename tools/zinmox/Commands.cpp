@@ -2,6 +2,7 @@
 #include "Commands.h"
 
 #include "Errors.h"
+#include "ZinMOX/ZinMOX_Version.h"
 
 namespace zinmox {
 
@@ -39,7 +40,7 @@ std::unique_ptr<CLI::App> buildApp(Session& session, bool forScript) {
            "JSON description of a simulated target, or tcp://HOST:PORT of a target server "
            "(default: the built-in demo design)")
         ->type_name("FILE");
-    app->set_version_flag("--version", std::string("zinmox ") + ZINMOX_TOOL_VERSION);
+    app->set_version_flag("--version", std::string("zinmox ") + ZINMOX_VERSION_STRING);
   }
   registerSubcommands(*app, session);
   CLI::App* top = app.get();
