@@ -26,20 +26,6 @@ def test_error_carries_the_messages_and_codes_of_the_call(session, core):
     core.define("ok", "async_out", 0)
 
 
-def test_library_checks_reach_python_with_their_text(session, core):
-    uninitialised = session.core((0, 1, 2))
-    with pytest.raises(zinmox.Error, match=r"^Data structures not initialized for MOX core "
-                       r"Device:0, user chain number:1, core index:2\.$"):
-        uninitialised.read()
-    core.define("fast", "async_out", 0)
-    with pytest.raises(zinmox.Error, match="^.pulsetrain cannot be used with the non-synchronous "
-                       "output: fast$"):
-        core.write(fast=[0] * 16)
-    core.undefine("fast", "async_out")
-    with pytest.raises(zinmox.Error, match="Could not find a signal with the name: fast"):
-        core.write(fast=1)
-
-
 def test_failing_transfer_and_status_read(session, core):
     core.define("ctl", "async_out", 0)
     session.target.fail_next_transfer("cable unplugged")

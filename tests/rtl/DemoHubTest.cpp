@@ -78,8 +78,7 @@ TEST_F(DemoHub, DiscoveryAndStatusRecords) {
   EXPECT_EQ(number(bench_.dr(Bits(32, 0)), 0, 32), 0x1A5E0A5Bu);  // IDCODE after reset
   bench_.ir(kUser1);
   const Bits info = hub_.record(kHubInfo, 0, 32);
-  EXPECT_EQ(hub_.lastCaptureWord().pattern, 0x5Au);
-  EXPECT_EQ(hub_.lastCaptureWord().version, 1u);
+  EXPECT_TRUE(hub_.lastCaptureWord().hub);  // pattern 0x5A and version 1
   EXPECT_EQ(number(info, 0, 8), 1u);
   EXPECT_EQ(number(info, 8, 5), 4u);
 
@@ -108,7 +107,8 @@ TEST_F(DemoHub, DiscoveryAndStatusRecords) {
   EXPECT_EQ(number(hub_.record(kStatus, 9, 128), 0, 64), 0u);  // no core: zeros, valid CRC
 
   // A header without the key does nothing and shifts zeros.
-  Bits keyless = Client::header(kHubInfo, 0, 0x5A);
+  Bits keyless;
+  appendNumber(keyless, 0x5A00, 16);  // op 0, core 0, key 0x5A
   keyless.resize(80, 0);
   const Bits out = bench_.dr(keyless);
   EXPECT_EQ(number(out, 16, 64), 0u);
@@ -116,7 +116,7 @@ TEST_F(DemoHub, DiscoveryAndStatusRecords) {
   for (uint32_t ir : {kUser2, kBypass}) {
     bench_.ir(ir);
     hub_.scan(kHubInfo, 0, Bits(48, 1));
-    EXPECT_NE(hub_.lastCaptureWord().pattern, 0x5Au) << "IR " << ir;
+    EXPECT_FALSE(hub_.lastCaptureWord().hub) << "IR " << ir;
   }
 }
 
@@ -125,19 +125,18 @@ TEST_F(DemoHub, BrokenStageIsRefusedAndBusyStopsCommands) {
   const Image good = fullImage(kCores[1], rng);
   hub_.stage(1, good);
   EXPECT_EQ(hub_.result(kCommit, 1), 1);
-  EXPECT_FALSE(hub_.lastCaptureWord().stageBad);
+  EXPECT_FALSE(hub_.lastCaptureWord().stagedInvalid);
 
   // One flipped bit: the CRC fails, the next scan reports it and a commit refuses.
-  Bits payload = stageNumber(fullImage(kCores[1], rng));
-  appendCrc(payload, crc16(payload, 0, payload.size()));
-  payload[5] ^= 1;
-  hub_.scan(kStage, 1, payload);
+  Bits payload = Client::stageScan(1, fullImage(kCores[1], rng));
+  payload[21] ^= 1;
+  hub_.raw(payload);
   EXPECT_EQ(hub_.result(kCommit, 1), 2);
-  EXPECT_TRUE(hub_.lastCaptureWord().stageBad);
+  EXPECT_TRUE(hub_.lastCaptureWord().stagedInvalid);
   // A stage one bit too long fails too.
-  payload[5] ^= 1;
+  payload[21] ^= 1;
   payload.push_back(0);
-  hub_.scan(kStage, 1, payload);
+  hub_.raw(payload);
   EXPECT_EQ(hub_.result(kCommit, 1), 2);
   // Commands to the status-only core are no operations: no start bit.
   EXPECT_EQ(hub_.result(kClear, 3), -1);
@@ -156,9 +155,8 @@ TEST_F(DemoHub, ResetInTheMiddleOfAScan) {
   ASSERT_EQ(hub_.result(kCommit, 1), 1);
 
   // TRST in the middle of a stage scan: the image is invalid, a commit refuses.
-  Bits payload = stageNumber(fullImage(kCores[1], rng));
-  appendCrc(payload, crc16(payload, 0, payload.size()));
-  hub_.scan(kStage, 1, payload, 40);
+  const Bits payload = Client::stageScan(1, fullImage(kCores[1], rng));
+  hub_.raw(payload, 56);
   bench_.pulseTrst();
   bench_.ir(kUser1);
   EXPECT_EQ(hub_.result(kCommit, 1), 2);
@@ -174,7 +172,7 @@ TEST_F(DemoHub, ResetInTheMiddleOfAScan) {
   for (int i = 0; i < 8; ++i) EXPECT_EQ(in[i].value, first.asyncValue[i]);
 
   // TMS reset (five ones) cuts a stage scan short through Update-DR.
-  hub_.scan(kStage, 1, payload, 60);
+  hub_.raw(payload, 76);
   bench_.resetTap();
   bench_.ir(kUser1);
   EXPECT_EQ(hub_.result(kCommit, 1), 2);

@@ -1,5 +1,5 @@
-// The host side of the hub protocol (docs/hub-protocol.md) over a PinBench: request headers,
-// the capture word, CRC-16, status records, stage images and capture read-outs.
+// The host side of the hub protocol (docs/hub-protocol.md) over a PinBench, built on ZinHub's
+// codec and CRC: status records, stage images, request replies and capture read-outs.
 #pragma once
 
 #include <algorithm>
@@ -10,43 +10,21 @@
 #include <vector>
 
 #include "PinBench.h"
+#include "ZinHub/Crc16.h"
+#include "ZinHub/HubCodec.h"
 
 namespace RtlTest {
 
 enum Op : uint32_t { kHubInfo = 0, kStage = 1, kCommit = 2, kCapture = 3, kClear = 4, kStatus = 5 };
 
-inline void appendNumber(Bits& bits, uint64_t value, int length) {
-  for (int i = 0; i < length; ++i) bits.push_back((value >> i) & 1u);
-}
+using ZinHub::appendNumber;
+using ZinHub::crc16;
+using CaptureWord = ZinHub::CaptureWord;
 inline uint64_t number(const Bits& bits, size_t first, size_t length) {
-  uint64_t v = 0;
-  for (size_t i = 0; i < length; ++i) v |= uint64_t{bits.at(first + i)} << i;
-  return v;
-}
-
-// CRC-16 register (0x1021, initial 0xFFFF) after feeding bits in order.
-inline uint16_t crc16(const Bits& bits, size_t first, size_t length) {
-  uint16_t crc = 0xFFFF;
-  for (size_t i = first; i < first + length; ++i) {
-    const bool feedback = ((crc >> 15) & 1u) != bits.at(i);
-    crc = static_cast<uint16_t>((crc << 1) ^ (feedback ? 0x1021 : 0));
-  }
-  return crc;
-}
-inline void appendCrc(Bits& bits, uint16_t crc) {
-  for (int i = 15; i >= 0; --i) bits.push_back((crc >> i) & 1u);
+  return ZinHub::readNumber(bits, first, static_cast<unsigned>(length));
 }
 inline bool crcOk(const Bits& bits, size_t first, size_t length) {
   return crc16(bits, first, length + 16) == 0;
-}
-
-struct CaptureWord {
-  uint32_t pattern, version;
-  bool busy, stageBad;
-};
-inline CaptureWord decodeCaptureWord(const Bits& out) {
-  return {static_cast<uint32_t>(number(out, 0, 8)), static_cast<uint32_t>(number(out, 8, 4)),
-          out.at(12) != 0, out.at(13) != 0};
 }
 
 // An output image for a stage scan.
@@ -84,21 +62,22 @@ class HubClient {
  public:
   HubClient(Bench& bench, uint32_t waitBits = 64) : bench_(bench), wait_(waitBits) {}
 
-  static Bits header(uint32_t op, uint32_t core, uint32_t key = 0xA5) {
+  static Bits header(uint32_t op, uint32_t core) {
     Bits h;
-    appendNumber(h, op, 4);
-    appendNumber(h, core, 4);
-    appendNumber(h, key, 8);
+    ZinHub::appendHeader(h, static_cast<ZinHub::HubOp>(op), core);
     return h;
   }
 
-  // One DR scan: header plus payload; returns everything TDO gave.
+  // One DR scan of the given TDI bits; returns everything TDO gave.
+  Bits raw(const Bits& in, size_t stopAfter = SIZE_MAX) {
+    Bits out = bench_.dr(in, stopAfter);
+    last_ = ZinHub::parseCaptureWord(out);
+    return out;
+  }
   Bits scan(uint32_t op, uint32_t core, const Bits& payload, size_t stopAfter = SIZE_MAX) {
     Bits in = header(op, core);
     in.insert(in.end(), payload.begin(), payload.end());
-    Bits out = bench_.dr(in, stopAfter);
-    last_ = decodeCaptureWord(out);
-    return out;
+    return raw(in, stopAfter);
   }
   const CaptureWord& lastCaptureWord() const { return last_; }
 
@@ -109,21 +88,19 @@ class HubClient {
     return Bits(out.begin() + 16, out.begin() + 16 + static_cast<long>(length));
   }
 
-  void stage(uint32_t core, const Image& image) {
-    Bits payload = stageNumber(image);
-    appendCrc(payload, crc16(payload, 0, payload.size()));
-    scan(kStage, core, payload);
+  // A stage scan's TDI: header, the image's number and its CRC.
+  static Bits stageScan(uint32_t core, const Image& image) {
+    return ZinHub::stageRequest(core, stageNumber(image));
   }
+  void stage(uint32_t core, const Image& image) { raw(stageScan(core, image)); }
 
   // A request op: returns the reply bits after the start bit, or nothing without a start bit.
   std::optional<Bits> request(uint32_t op, uint32_t core, size_t replyLength) {
     const Bits out = scan(op, core, Bits(wait_ + 1 + replyLength, 0));
-    for (size_t i = 16; i <= 16 + wait_; ++i) {
-      if (out[i])
-        return Bits(out.begin() + static_cast<long>(i) + 1,
-                    out.begin() + static_cast<long>(i + 1 + replyLength));
-    }
-    return std::nullopt;
+    const auto at = ZinHub::findReply(out, static_cast<unsigned>(wait_));
+    if (!at) return std::nullopt;
+    return Bits(out.begin() + static_cast<long>(*at),
+                out.begin() + static_cast<long>(*at + replyLength));
   }
   // Commit or clear: the 8-bit result (bit 0 done, bit 1 refused), -1 without an answer.
   int result(uint32_t op, uint32_t core) {

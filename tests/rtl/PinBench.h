@@ -8,9 +8,11 @@
 #include <random>
 #include <vector>
 
+#include "ZinHub/PinJtagEngine.h"
+
 namespace RtlTest {
 
-using Bits = std::vector<uint8_t>;  // one bit per element, bit 0 shifted first
+using Bits = ZinHub::BitVector;  // one bit per element, bit 0 shifted first
 
 // Periods in arbitrary time units; jitter is a fraction of each half period (0 to 0.9).
 struct ClockPlan {
@@ -24,7 +26,7 @@ inline void PrintTo(const ClockPlan& p, std::ostream* os) {
 }
 
 template <class Model>
-class PinBench {
+class PinBench : public ZinHub::JtagPins {
  public:
   explicit PinBench(const ClockPlan& plan) : plan_(plan), rng_(plan.seed) {
     m_.clk_i = 0;
@@ -42,7 +44,7 @@ class PinBench {
   }
   PinBench(const PinBench&) = delete;
   PinBench& operator=(const PinBench&) = delete;
-  ~PinBench() { m_.final(); }
+  ~PinBench() override { m_.final(); }
 
   Model& model() { return m_; }
   uint64_t clkEdges() const { return edges_; }
@@ -79,6 +81,7 @@ class PinBench {
     m_.eval();
     return tdo;
   }
+  bool clock(bool tms, bool tdi) override { return tck(tms, tdi); }
 
   void resetTap() {
     for (int i = 0; i < 5; ++i) tck(true, false);
@@ -96,32 +99,21 @@ class PinBench {
     for (int i = 0; i < cycles; ++i) tck(false, false);
   }
 
-  // IR scan from Run-Test/Idle back to Run-Test/Idle.
-  void ir(uint32_t value, int length = 4) {
-    tck(true, false);
-    tck(true, false);
-    tck(false, false);
-    tck(false, false);
-    for (int i = 0; i < length; ++i) tck(i == length - 1, (value >> i) & 1u);
-    tck(true, false);
-    tck(false, false);
+  // IR and whole DR scans go from Run-Test/Idle back to it through ZinHub's TAP walker. With
+  // stopAfter set, a DR scan stops in Shift-DR after that many bits (for tests that cut a scan
+  // short, then reset the TAP).
+  void ir(uint32_t value, uint32_t length = 4) {
+    engine_.queueIrScan(0, length, value);
+    engine_.execute();
   }
-
-  // DR scan from Run-Test/Idle. With stopAfter set, the scan stops in Shift-DR after that many
-  // bits (for tests that cut a scan short); otherwise it returns to Run-Test/Idle.
   Bits dr(const Bits& in, size_t stopAfter = SIZE_MAX) {
-    tck(true, false);
-    tck(false, false);
-    tck(false, false);
-    Bits out;
-    out.reserve(in.size());
-    for (size_t i = 0; i < in.size() && i < stopAfter; ++i) {
-      out.push_back(tck(i + 1 == in.size(), in[i]));
-    }
     if (stopAfter >= in.size()) {
-      tck(true, false);
-      tck(false, false);
+      engine_.queueDrScan(0, in);
+      return engine_.execute().front();
     }
+    for (bool tms : {true, false, false}) tck(tms, false);  // Select-DR, Capture-DR, Shift-DR
+    Bits out;
+    for (size_t i = 0; i < stopAfter; ++i) out.push_back(tck(false, in[i]));
     return out;
   }
 
@@ -132,6 +124,7 @@ class PinBench {
   }
 
   Model m_;
+  ZinHub::PinJtagEngine engine_{*this};
   ClockPlan plan_;
   std::mt19937 rng_;
   double now_ = 0;
