@@ -17,8 +17,8 @@ void keepMessage(void*, uint32_t, uint32_t, const char* text) {
   lastMessage = text;
 }
 
-ZinTarget::MoxStatus statusOf(uint32_t width) {
-  ZinTarget::MoxStatus status;
+ZinTestKit::MoxStatus statusOf(uint32_t width) {
+  ZinTestKit::MoxStatus status;
   status.asyncInputCount = width;
   status.syncInputCount = width;
   status.asyncOutputCount = width;

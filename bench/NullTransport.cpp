@@ -10,9 +10,9 @@ namespace {
 constexpr uint32_t kMoxCoreType = 9;
 }  // namespace
 
-NullTransport::NullTransport(const ZinTarget::MoxStatus& status)
+NullTransport::NullTransport(const ZinTestKit::MoxStatus& status)
     : info_{0x1234, kMoxCoreType, status.majorVersion, status.minorVersion, 1},
-      statusWord_(ZinTarget::buildMoxStatusWord(status)) {}
+      statusWord_(ZinTestKit::buildMoxStatusWord(status)) {}
 
 void NullTransport::readStatus(const ZIN_CORE_REF&, ZIN_CORE_INFO& info, unsigned char* status,
                                uint32_t statusBytes, uint32_t) {

@@ -7,7 +7,7 @@
 #include <vector>
 
 #include "ZinRT/Zin_Transport.h"
-#include "ZinTarget/StatusWord.h"
+#include "ZinTestKit/StatusWord.h"
 
 namespace ZinBench {
 
@@ -16,7 +16,7 @@ namespace ZinBench {
 /// framework put there.
 class NullTransport : public ZinRT::Zin_Transport {
  public:
-  explicit NullTransport(const ZinTarget::MoxStatus& status);
+  explicit NullTransport(const ZinTestKit::MoxStatus& status);
 
   void readStatus(const ZIN_CORE_REF& ref, ZIN_CORE_INFO& info, unsigned char* status,
                   uint32_t statusBytes, uint32_t statusBitCount) override;

@@ -39,7 +39,7 @@ void fail(const std::string& what) {
   std::abort();
 }
 
-FuzzSession::FuzzSession() : transport_(std::make_shared<ZinTarget::ScriptedTransport>()) {
+FuzzSession::FuzzSession() : transport_(std::make_shared<ZinTestKit::ScriptedTransport>()) {
   handle_ = ZinJtag_openSession(transport_);
   ZinJtag_setMessageHandler(handle_, &FuzzSession::onMessage, this);
 }
@@ -50,7 +50,7 @@ FuzzSession::~FuzzSession() {
 
 void FuzzSession::placeCore(const ZIN_CORE_REF& ref, uint32_t asyncIn, uint32_t syncIn,
                             uint32_t asyncOut, uint32_t syncOut) {
-  ZinTarget::MoxStatus status;
+  ZinTestKit::MoxStatus status;
   status.asyncInputCount = asyncIn;
   status.syncInputCount = syncIn;
   status.asyncOutputCount = asyncOut;

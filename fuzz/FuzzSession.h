@@ -9,7 +9,7 @@
 #include <vector>
 
 #include "ZinMOX/ZinMOX.h"
-#include "ZinTarget/ScriptedTransport.h"
+#include "ZinTestKit/ScriptedTransport.h"
 
 namespace ZinFuzz {
 
@@ -39,12 +39,12 @@ class FuzzSession {
   void check(const char* call, uint32_t result);
 
   uint32_t handle() const { return handle_; }
-  ZinTarget::ScriptedTransport& transport() { return *transport_; }
+  ZinTestKit::ScriptedTransport& transport() { return *transport_; }
 
  private:
   static void onMessage(void* user, uint32_t handle, uint32_t code, const char* text);
 
-  std::shared_ptr<ZinTarget::ScriptedTransport> transport_;
+  std::shared_ptr<ZinTestKit::ScriptedTransport> transport_;
   uint32_t handle_ = 0;
   std::vector<Message> messages_;
 };

@@ -139,7 +139,7 @@ FAULTS = [
           "bytes[whole] &= static_cast<unsigned char>((1u << (bitCount % 8)) - 1);",
           "bytes[whole] &= static_cast<unsigned char>((1u << (bitCount % 8)) | 0xFF);"),
     Fault("odd status bit count: the scripted target gives the bits above the count",
-          "src/ZinTarget/ScriptedTransport.cpp",
+          "src/ZinTestKit/ScriptedTransport.cpp",
           "status[count - 1] &= static_cast<unsigned char>((1u << (statusBitCount % 8)) - 1);",
           "status[count - 1] &= static_cast<unsigned char>((1u << (statusBitCount % 8)) | 0xFF);"),
     # --- the simulator ------------------------------------------------------------------------

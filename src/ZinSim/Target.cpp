@@ -11,7 +11,7 @@
 #include "DescriptionCheck.h"
 #include "HexNumber.h"
 #include "SimCore.h"
-#include "ZinTarget/StatusWord.h"
+#include "ZinTestKit/StatusWord.h"
 
 namespace ZinSim {
 
@@ -49,7 +49,7 @@ struct Target::State {
 namespace {
 
 std::vector<unsigned char> moxStatusWord(const CoreDescription& d) {
-  ZinTarget::MoxStatus s;
+  ZinTestKit::MoxStatus s;
   s.majorVersion = d.majorVersion;
   s.minorVersion = d.minorVersion;
   s.asyncInputCount = d.asyncInputs;
@@ -59,7 +59,7 @@ std::vector<unsigned char> moxStatusWord(const CoreDescription& d) {
   s.qxMajorVersion = d.qxMajorVersion;
   s.qxMinorVersion = d.qxMinorVersion;
   s.qxMinorVersionAlpha = d.qxMinorVersionAlpha;
-  return ZinTarget::buildMoxStatusWord(s);
+  return ZinTestKit::buildMoxStatusWord(s);
 }
 
 SimCore buildCore(const CoreDescription& d) {

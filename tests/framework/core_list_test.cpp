@@ -12,12 +12,12 @@
 #include "ZinRT/ZinJtag.h"
 #include "ZinRT/Zin_CoreComm.h"
 #include "ZinRT/Zin_CoreList.h"
-#include "ZinTarget/ScriptedTransport.h"
-#include "ZinTarget/StatusWord.h"
+#include "ZinTestKit/ScriptedTransport.h"
+#include "ZinTestKit/StatusWord.h"
 
 using ZinRT::Zin_Core;
 using ZinRT::Zin_CoreList;
-using ZinTarget::ScriptedTransport;
+using ZinTestKit::ScriptedTransport;
 
 namespace {
 
@@ -121,7 +121,7 @@ TEST_F(CoreListTest, StatusWordsOfEveryLayoutDecodeToTheirFields) {
                         {10, 0, 3, 0xFFFF, 0x8001, 12, 0xF, 0xA5}};
   ZIN_CORE_REF ref{1, 2, 0};
   for (const Case& c : cases) {
-    ZinTarget::MoxStatus s;
+    ZinTestKit::MoxStatus s;
     s.majorVersion = c.major;
     s.minorVersion = c.minor;
     s.asyncInputCount = c.ai;
@@ -139,10 +139,10 @@ TEST_F(CoreListTest, StatusWordsOfEveryLayoutDecodeToTheirFields) {
               (std::vector<uint32_t>{c.ai, c.si, c.ao, c.so, c.qxMajor, c.qxMinor}))
         << c.major << "." << c.minor;
     s.qxMajorVersion = 0x10;  // four bits in the full layout, none in the older ones
-    EXPECT_THROW(ZinTarget::buildMoxStatusWord(s), std::invalid_argument);
+    EXPECT_THROW(ZinTestKit::buildMoxStatusWord(s), std::invalid_argument);
     s.qxMajorVersion = 0;
-    s.syncInputCount = ZinTarget::versionKey(s) >= 0x62 ? 0x10000 : 0x100;
-    EXPECT_THROW(ZinTarget::buildMoxStatusWord(s), std::invalid_argument);
+    s.syncInputCount = ZinTestKit::versionKey(s) >= 0x62 ? 0x10000 : 0x100;
+    EXPECT_THROW(ZinTestKit::buildMoxStatusWord(s), std::invalid_argument);
   }
 }
 

@@ -11,7 +11,7 @@
 #include <vector>
 
 #include "ZinRT/ZinJtag.h"
-#include "ZinTarget/ScriptedTransport.h"
+#include "ZinTestKit/ScriptedTransport.h"
 
 namespace {
 
@@ -33,7 +33,7 @@ struct Inbox {
 };
 
 uint32_t openScripted() {
-  return ZinJtag_openSession(std::make_shared<ZinTarget::ScriptedTransport>());
+  return ZinJtag_openSession(std::make_shared<ZinTestKit::ScriptedTransport>());
 }
 
 std::string whatOf(const std::function<void()>& call) {
@@ -48,7 +48,7 @@ std::string whatOf(const std::function<void()>& call) {
 }  // namespace
 
 TEST(JtagSession, HandlesAreDistinctReachTheirTransportAndUnknownHandlesAreRejected) {
-  auto transport = std::make_shared<ZinTarget::ScriptedTransport>();
+  auto transport = std::make_shared<ZinTestKit::ScriptedTransport>();
   const uint32_t a = ZinJtag_openSession(transport);
   const uint32_t b = openScripted();
   EXPECT_NE(a, 0u);
@@ -135,8 +135,8 @@ TEST(JtagSession, TargetLockIsReentrantCountedAndTimesOutForAnotherThread) {
 }
 
 TEST(JtagSession, SessionClosedWhileLockedStaysValidForTheLock) {
-  auto transport = std::make_shared<ZinTarget::ScriptedTransport>();
-  std::weak_ptr<ZinTarget::ScriptedTransport> watch = transport;
+  auto transport = std::make_shared<ZinTestKit::ScriptedTransport>();
+  std::weak_ptr<ZinTestKit::ScriptedTransport> watch = transport;
   const uint32_t h = ZinJtag_openSession(std::move(transport));
   {
     ZinJtagTargetLock lock(h, 1000);

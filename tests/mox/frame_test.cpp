@@ -23,7 +23,7 @@ namespace {
 using namespace ZinTest;
 using ZinRT::Zin_CoreList;
 using ZinRT::ZinMOX_ValueMap;
-using Failure = ZinTarget::ScriptedTransport::Failure;
+using Failure = ZinTestKit::ScriptedTransport::Failure;
 
 static_assert(!std::is_copy_constructible_v<ZinRT::ZinMOX_Core> &&
                   !std::is_copy_assignable_v<ZinRT::ZinMOX_Core>,
@@ -146,7 +146,7 @@ TEST_F(CallFrame, EveryCallTakesTheLockAndRefusesANullReference) {
 }
 
 TEST_F(CallFrame, StatusCallsCheckTheirArgumentsAroundTheLock) {
-  transport->placeMoxCore(ref, ZinTarget::MoxStatus{});
+  transport->placeMoxCore(ref, ZinTestKit::MoxStatus{});
   const uint64_t before = ZinJtag_session_lockCount(handle);
   uintptr_t nullWord = 0;
   EXPECT_EQ(errorOf(ZinMOX_getInfo(handle, &ref, nullptr)),
@@ -185,14 +185,14 @@ TEST_F(CallFrame, WrongCoreTypeIsReportedUnderTheLockThenAborted) {
     EXPECT_EQ(result, 0u);
   }
   uint32_t result = 77;
-  transport->placeMoxCore(ref, ZinTarget::MoxStatus{});
+  transport->placeMoxCore(ref, ZinTestKit::MoxStatus{});
   EXPECT_EQ(ZinMOX_isMOXCore(handle, &ref, &result), 0u);
   EXPECT_EQ(result, 1u);
   expectNoMessages();
 }
 
 TEST_F(CallFrame, AFailingStatusReadIsReportedWithItsOwnText) {
-  transport->placeMoxCore(ref, ZinTarget::MoxStatus{});
+  transport->placeMoxCore(ref, ZinTestKit::MoxStatus{});
   const std::vector<std::pair<Failure, std::string>> cases = {
       {Failure::Runtime, "status read broke"},
       {Failure::BadAlloc, std::bad_alloc().what()},
@@ -258,7 +258,7 @@ TEST_F(CallFrame, GetInfoDecodesEachLayoutFromTheVersionKey) {
 }
 
 TEST_F(CallFrame, GetCoreInfoWritesDecimalTextsAndKeepsOtherKeys) {
-  ZinTarget::MoxStatus status;
+  ZinTestKit::MoxStatus status;
   status.majorVersion = 10;
   status.minorVersion = 3;
   status.asyncInputCount = 65535;
@@ -292,7 +292,7 @@ TEST_F(CallFrame, GetCoreInfoWritesDecimalTextsAndKeepsOtherKeys) {
 TEST_F(CallFrame, FailuresAreReportedOnTheCallersSessionInOrder) {
   std::vector<std::pair<uint32_t, std::string>> other;
   const uint32_t otherHandle =
-      ZinJtag_openSession(std::make_shared<ZinTarget::ScriptedTransport>());
+      ZinJtag_openSession(std::make_shared<ZinTestKit::ScriptedTransport>());
   ZinJtag_setMessageHandler(
       otherHandle,
       [](void* user, uint32_t, uint32_t code, const char* text) {
@@ -351,7 +351,7 @@ TEST_F(CallFrame, TerminateRemovesOnlyAMoxCoreAndInitReplacesAForeignOne) {
 
   // A MOX core answers: init replaces a foreign core with a MOX core.
   registerForeignCore(3);
-  transport->placeMoxCore(ref, ZinTarget::MoxStatus{});
+  transport->placeMoxCore(ref, ZinTestKit::MoxStatus{});
   EXPECT_EQ(ZinMOX_initCore(handle, &ref), 0u);
   EXPECT_NE(registeredCore(ref), nullptr);
   // The core now reports type 3: re-init removes the MOX core.
@@ -408,7 +408,7 @@ TEST_F(CallFrame, ACallWaitsForTheLockHeldByACallInsideItsTransfer) {
 }
 
 // A transport that answers every status read with all bits set, far beyond the asked ones.
-class FloodingTransport : public ZinTarget::ScriptedTransport {
+class FloodingTransport : public ZinTestKit::ScriptedTransport {
  public:
   void readStatus(const ZIN_CORE_REF&, ZIN_CORE_INFO& info, unsigned char* status, uint32_t bytes,
                   uint32_t) override {
@@ -421,7 +421,7 @@ TEST(StatusRead, KeepsExactlyTheAskedBitsForEveryBitCount) {
   const ZIN_CORE_REF at{1, 0, 2};
   auto flooding = std::make_shared<FloodingTransport>();
   const uint32_t session = ZinJtag_openSession(flooding);
-  ZinTarget::ScriptedTransport scripted;
+  ZinTestKit::ScriptedTransport scripted;
   scripted.placeCore(at, ZIN_CORE_INFO{7, 9, 10, 0, 3}, std::vector<unsigned char>(4, 0xFF));
   // (bit count, the four bytes that hold exactly that many bits)
   const std::vector<std::pair<uint32_t, std::vector<unsigned char>>> cases = {

@@ -194,7 +194,7 @@ TEST_F(WriteValues, AnEmptyMapSendsTheImageWithNothingMarked) {
 using ValueWire = SessionFixture;
 
 TEST_F(ValueWire, DefineABusWriteItAndDecodeTheWire) {
-  ZinTarget::MoxStatus status;
+  ZinTestKit::MoxStatus status;
   status.asyncOutputCount = 8;
   status.syncOutputCount = 2;
   transport->placeMoxCore(ref, status);
@@ -269,7 +269,7 @@ TEST_F(ReadValues, WithoutNamedInputsOrOnAFailedReadTheMapStaysAsItWas) {
   ASSERT_EQ(read(map), 0u);
   EXPECT_EQ(transport->transfers().size(), 1u) << "the read still happens";
   ASSERT_EQ(ZinMOX_defineSignal(handle, &ref, "in", ZINMOX_ASYNC_INPUT, 2), 0u);
-  transport->failNextCommand(ZinTarget::ScriptedTransport::Failure::Runtime, "cable unplugged");
+  transport->failNextCommand(ZinTestKit::ScriptedTransport::Failure::Runtime, "cable unplugged");
   EXPECT_EQ(errorOf(read(map)), "cable unplugged");
   EXPECT_EQ(map, (ZinMOX_ValueMap{{"x", "1"}}));
 }

@@ -7,7 +7,7 @@
 
 #include "HubClient.h"
 #include "Vzinmox_demo_top.h"
-#include "ZinTarget/StatusWord.h"
+#include "ZinTestKit/StatusWord.h"
 
 namespace RtlTest {
 namespace {
@@ -87,7 +87,7 @@ TEST_F(DemoHub, DiscoveryAndStatusRecords) {
     const Bits rec = hub_.record(kStatus, k, 128);
     EXPECT_EQ(number(rec, 0, 40), 165u | 9u << 8 | uint64_t{c.major} << 16 |
                                       uint64_t{c.minor} << 24 | uint64_t{c.revision} << 32);
-    ZinTarget::MoxStatus s;
+    ZinTestKit::MoxStatus s;
     s.majorVersion = c.major;
     s.minorVersion = c.minor;
     s.asyncOutputCount = c.ao;
@@ -96,7 +96,7 @@ TEST_F(DemoHub, DiscoveryAndStatusRecords) {
     s.syncInputCount = c.si;
     s.qxMajorVersion = c.qxMajor;
     s.qxMinorVersion = c.qxMinor;
-    const auto word = ZinTarget::buildMoxStatusWord(s);
+    const auto word = ZinTestKit::buildMoxStatusWord(s);
     for (size_t b = 40; b < 128; ++b) {
       EXPECT_EQ(rec[b], (word[b / 8] >> (b % 8)) & 1u) << "core " << k << " status bit " << b;
     }

@@ -16,7 +16,7 @@
 #include "FailingAllocator.h"
 #include "ZinMOX/ZinMOX.h"
 #include "ZinRT/ZinJtag.h"
-#include "ZinTarget/ScriptedTransport.h"
+#include "ZinTestKit/ScriptedTransport.h"
 
 namespace {
 
@@ -50,8 +50,8 @@ struct Recorder {
 // A session with one MOX core and the calls of the sequence.
 class Scenario {
  public:
-  Scenario() : transport_(std::make_shared<ZinTarget::ScriptedTransport>()) {
-    ZinTarget::MoxStatus status;
+  Scenario() : transport_(std::make_shared<ZinTestKit::ScriptedTransport>()) {
+    ZinTestKit::MoxStatus status;
     status.asyncInputCount = 12;
     status.syncInputCount = 9;
     status.asyncOutputCount = 10;
@@ -123,7 +123,7 @@ class Scenario {
   static constexpr uint32_t stepBits[3] = {6, 0, 2};
   static constexpr uint32_t inBits[4] = {8, 1, 4, 5};
 
-  std::shared_ptr<ZinTarget::ScriptedTransport> transport_;
+  std::shared_ptr<ZinTestKit::ScriptedTransport> transport_;
   uint32_t handle_ = 0;
   ZIN_CORE_REF ref_{1, 2, 0};
   ZinRT::ZinMOX_ValueMap writeMap_{{"ctl", "2A5"},

@@ -14,7 +14,7 @@
 #include "ZinRT/ZinJtag.h"
 #include "ZinRT/Zin_ByteBuffer.h"
 #include "ZinRT/Zin_NumberUtil.h"
-#include "ZinTarget/ScriptedTransport.h"
+#include "ZinTestKit/ScriptedTransport.h"
 #include "support/WireFormat.h"
 
 namespace {
@@ -96,8 +96,8 @@ TEST(ConversionEquivalence, FrameworkConversionsMatchBitByBitReferences) {
 TEST(ConversionEquivalence, PortWritesAndReadsMatchTheLayouts) {
   std::mt19937 rng(77);
   for (int round = 0; round < 60; ++round) {
-    auto transport = std::make_shared<ZinTarget::ScriptedTransport>();
-    ZinTarget::MoxStatus status;
+    auto transport = std::make_shared<ZinTestKit::ScriptedTransport>();
+    ZinTestKit::MoxStatus status;
     const uint32_t aIn = status.asyncInputCount = rng() % 70;
     const uint32_t sIn = status.syncInputCount = rng() % 70;
     const uint32_t aOut = status.asyncOutputCount = rng() % 70;

@@ -14,7 +14,7 @@
 
 #include "ZinMOX/ZinMOX.h"
 #include "ZinRT/ZinJtag.h"
-#include "ZinTarget/ScriptedTransport.h"
+#include "ZinTestKit/ScriptedTransport.h"
 
 namespace {
 
@@ -33,9 +33,9 @@ void recordOnThisThread(void*, uint32_t handle, uint32_t code, const char* text)
 }
 
 // A scripted target with a 16/12/16/12 MOX core at each of `refs`.
-std::shared_ptr<ZinTarget::ScriptedTransport> moxTarget(const std::vector<ZIN_CORE_REF>& refs) {
-  auto transport = std::make_shared<ZinTarget::ScriptedTransport>();
-  ZinTarget::MoxStatus status;
+std::shared_ptr<ZinTestKit::ScriptedTransport> moxTarget(const std::vector<ZIN_CORE_REF>& refs) {
+  auto transport = std::make_shared<ZinTestKit::ScriptedTransport>();
+  ZinTestKit::MoxStatus status;
   status.asyncInputCount = status.asyncOutputCount = 16;
   status.syncInputCount = status.syncOutputCount = 12;
   for (const ZIN_CORE_REF& ref : refs) transport->placeMoxCore(ref, status);

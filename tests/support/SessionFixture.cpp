@@ -19,7 +19,7 @@ std::string logicErrorOf(const std::function<void()>& call) {
 }
 
 void SessionFixture::SetUp() {
-  transport = std::make_shared<ZinTarget::ScriptedTransport>();
+  transport = std::make_shared<ZinTestKit::ScriptedTransport>();
   handle = ZinJtag_openSession(transport);
   ZinJtag_setMessageHandler(handle, &SessionFixture::onMessage, this);
 }
@@ -78,7 +78,7 @@ void SessionFixture::expectNoMessages() {
 ZinRT::ZinMOX_Core* SessionFixture::initMoxCore(const ZIN_CORE_REF& coreRef, uint32_t asyncIn,
                                                 uint32_t syncIn, uint32_t asyncOut,
                                                 uint32_t syncOut) {
-  ZinTarget::MoxStatus status;
+  ZinTestKit::MoxStatus status;
   status.asyncInputCount = asyncIn;
   status.syncInputCount = syncIn;
   status.asyncOutputCount = asyncOut;

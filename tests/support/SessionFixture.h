@@ -13,7 +13,7 @@
 
 #include "ZinMOX/ZinMOX.h"
 #include "ZinMOX/ZinMOX_Core.h"
-#include "ZinTarget/ScriptedTransport.h"
+#include "ZinTestKit/ScriptedTransport.h"
 #include "support/WireFormat.h"
 
 namespace ZinTest {
@@ -64,7 +64,7 @@ class SessionFixture : public ::testing::Test {
   /// "DD C K " for a core reference, as the command lines start.
   static std::string linePrefix(const ZIN_CORE_REF& coreRef);
 
-  std::shared_ptr<ZinTarget::ScriptedTransport> transport;
+  std::shared_ptr<ZinTestKit::ScriptedTransport> transport;
   uint32_t handle = 0;
   /// The reference most tests use: device 1, user chain 2, core 0.
   ZIN_CORE_REF ref{1, 2, 0};

@@ -1,6 +1,6 @@
 // A transport for tests: records every transfer and answers from what the test prepared.
-#ifndef ZINTARGET_SCRIPTEDTRANSPORT_H
-#define ZINTARGET_SCRIPTEDTRANSPORT_H
+#ifndef ZINTESTKIT_SCRIPTEDTRANSPORT_H
+#define ZINTESTKIT_SCRIPTEDTRANSPORT_H
 
 #include <condition_variable>
 #include <cstdint>
@@ -12,9 +12,9 @@
 #include <vector>
 
 #include "ZinRT/Zin_Transport.h"
-#include "ZinTarget/StatusWord.h"
+#include "ZinTestKit/StatusWord.h"
 
-namespace ZinTarget {
+namespace ZinTestKit {
 
 /// A scripted target. Thread-safe: a test may inspect it or release a blocked transfer from
 /// another thread.
@@ -93,6 +93,6 @@ class ScriptedTransport : public ZinRT::Zin_Transport {
   uint32_t statusReads_ = 0;
 };
 
-}  // namespace ZinTarget
+}  // namespace ZinTestKit
 
 #endif

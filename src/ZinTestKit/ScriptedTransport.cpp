@@ -1,5 +1,5 @@
 // The scripted transport of the tests.
-#include "ZinTarget/ScriptedTransport.h"
+#include "ZinTestKit/ScriptedTransport.h"
 
 #include <algorithm>
 #include <chrono>
@@ -8,7 +8,7 @@
 #include <stdexcept>
 #include <utility>
 
-namespace ZinTarget {
+namespace ZinTestKit {
 
 void ScriptedTransport::placeCore(const ZIN_CORE_REF& ref, const ZIN_CORE_INFO& info,
                                   std::vector<unsigned char> status) {
@@ -154,4 +154,4 @@ bool ScriptedTransport::listCores(std::vector<ZIN_CORE_REF>& refs) {
   return true;
 }
 
-}  // namespace ZinTarget
+}  // namespace ZinTestKit

@@ -1,11 +1,11 @@
 // Lays out the status word of a MOX core as a target reports it.
-#ifndef ZINTARGET_STATUSWORD_H
-#define ZINTARGET_STATUSWORD_H
+#ifndef ZINTESTKIT_STATUSWORD_H
+#define ZINTESTKIT_STATUSWORD_H
 
 #include <cstdint>
 #include <vector>
 
-namespace ZinTarget {
+namespace ZinTestKit {
 
 /// Number of status bytes a target keeps per core (enough for every layout).
 inline constexpr uint32_t kStatusWordBytes = 16;
@@ -33,6 +33,6 @@ uint32_t versionKey(const MoxStatus& status);
 /// core's version (the two older layouts have no qx fields, so there only 0 fits).
 std::vector<unsigned char> buildMoxStatusWord(const MoxStatus& status);
 
-}  // namespace ZinTarget
+}  // namespace ZinTestKit
 
 #endif

@@ -1,10 +1,10 @@
 // The status word of a MOX core, laid out the way the host's decoder reads it.
-#include "ZinTarget/StatusWord.h"
+#include "ZinTestKit/StatusWord.h"
 
 #include <stdexcept>
 #include <string>
 
-namespace ZinTarget {
+namespace ZinTestKit {
 
 namespace {
 
@@ -63,4 +63,4 @@ std::vector<unsigned char> buildMoxStatusWord(const MoxStatus& status) {
   return word;
 }
 
-}  // namespace ZinTarget
+}  // namespace ZinTestKit
