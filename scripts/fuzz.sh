@@ -16,7 +16,8 @@ shift
 build="${FUZZ_BUILD_DIR:-build/fuzz}"
 fuzzers=("$@")
 if [ ${#fuzzers[@]} -eq 0 ]; then
-  fuzzers=(value_map_fuzzer call_sequence_fuzzer sim_command_fuzzer sim_description_fuzzer)
+  fuzzers=(value_map_fuzzer call_sequence_fuzzer sim_command_fuzzer sim_description_fuzzer
+    server_frame_fuzzer)
 fi
 
 scripts/setup.sh fuzz

@@ -2,6 +2,7 @@
 #include "Frame.h"
 
 #include <cstdio>
+#include <utility>
 
 namespace ZinNet {
 
@@ -89,6 +90,15 @@ void FrameReader::end() const {
   if (pos_ != size_) {
     throw FrameError(std::string(what_) + " body too long: " + std::to_string(size_) + " bytes");
   }
+}
+
+Frame takeFrame(std::vector<unsigned char> bytes) {
+  if (bytes.empty()) throw FrameError("frame without a type byte");
+  Frame frame;
+  frame.type = static_cast<MessageType>(bytes.front());
+  bytes.erase(bytes.begin());
+  frame.body = std::move(bytes);
+  return frame;
 }
 
 uint32_t decodeLength(const unsigned char* prefix) {

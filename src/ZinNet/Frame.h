@@ -62,6 +62,10 @@ class FrameReader {
   const char* what_;
 };
 
+/// The frame made of the bytes after a length prefix (at least one): the type byte, then the body.
+/// Throws FrameError when there is no type byte.
+Frame takeFrame(std::vector<unsigned char> bytes);
+
 /// The frame length from the four prefix bytes.
 uint32_t decodeLength(const unsigned char* prefix);
 

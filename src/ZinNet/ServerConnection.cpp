@@ -16,7 +16,8 @@ ServerConnection::ServerConnection(std::shared_ptr<ServerState> state, asio::ip:
       socket_(std::move(socket)),
       timer_(socket_.get_executor()),
       requests_(std::move(requests)),
-      id_(id) {
+      id_(id),
+      rules_(state_->options) {
   std::error_code ec;
   const auto remote = socket_.remote_endpoint(ec);
   peer_ = ec ? std::string("an unknown peer")
@@ -99,7 +100,7 @@ void ServerConnection::onReadError(std::error_code ec, const char* where) {
 void ServerConnection::readPrefix() {
   if (closed_) return;
   // Before the hello, the greeting timer armed at the start runs on.
-  if (prefixBytes_ == 0 && greeted_) {
+  if (prefixBytes_ == 0 && rules_.greeted()) {
     armTimer(state_->options.idleTimeoutMs, "waiting for a frame");
   }
   socket_.async_read_some(
@@ -112,7 +113,7 @@ void ServerConnection::onPrefix(std::error_code ec, size_t n) {
     onReadError(ec, prefixBytes_ == 0 ? "between frames" : "inside a frame's length");
     return;
   }
-  if (prefixBytes_ == 0 && n != 0 && greeted_) {
+  if (prefixBytes_ == 0 && n != 0 && rules_.greeted()) {
     armTimer(state_->options.frameTimeoutMs, "a frame");
   }
   prefixBytes_ += n;
@@ -122,12 +123,9 @@ void ServerConnection::onPrefix(std::error_code ec, size_t n) {
   }
   prefixBytes_ = 0;
   const uint32_t length = decodeLength(prefix_.data());
-  if (length == 0) {
-    refuse("frame of length 0", true);
-  } else if (length > state_->options.maxFrameBytes) {
-    refuse("frame of " + std::to_string(length) + " bytes exceeds the limit of " +
-               std::to_string(state_->options.maxFrameBytes) + " bytes",
-           true);
+  const std::string problem = rules_.lengthProblem(length);
+  if (!problem.empty()) {
+    refuse(problem, true);
   } else {
     readBody(length);
   }
@@ -143,11 +141,7 @@ void ServerConnection::readBody(uint32_t length) {
                      }
                      // The body moves on without a copy, and the buffer keeps no memory between
                      // frames.
-                     Frame frame;
-                     frame.type = static_cast<MessageType>(self->body_.front());
-                     self->body_.erase(self->body_.begin());
-                     frame.body = std::exchange(self->body_, {});
-                     self->onFrame(std::move(frame));
+                     self->onFrame(takeFrame(std::exchange(self->body_, {})));
                    });
 }
 
@@ -155,39 +149,21 @@ void ServerConnection::onFrame(Frame frame) {
   if (closed_) return;
   disarmTimer();
   inExchange_ = true;
-  if (!greeted_) {
-    onHello(frame);
-  } else if (frame.type == MessageType::Hello) {
-    refuse("hello sent twice", false);
-  } else if (!isRequest(frame.type)) {
-    refuse("unknown request type " + typeText(static_cast<uint8_t>(frame.type)), false);
-  } else {
-    runRequest(std::move(frame));
+  FrameOutcome outcome = rules_.onFrame(frame);
+  switch (outcome.action) {
+    case FrameOutcome::Action::Request:
+      runRequest(std::move(frame));
+      break;
+    case FrameOutcome::Action::Reply:
+      send(std::move(outcome.bytes), false);
+      break;
+    case FrameOutcome::Action::Refuse:
+      refuse(outcome.why, false);
+      break;
+    case FrameOutcome::Action::Close:
+      refuse(outcome.why, true);
+      break;
   }
-}
-
-void ServerConnection::onHello(const Frame& frame) {
-  if (frame.type != MessageType::Hello) {
-    refuse("expected a hello frame first, got " + typeText(static_cast<uint8_t>(frame.type)), true);
-    return;
-  }
-  FrameReader in(frame, "hello");
-  if (in.remaining() != 6 || std::memcmp(in.bytes(4), Protocol::kMagic, 4) != 0) {
-    refuse("not a ZinNet hello", true);
-    return;
-  }
-  const uint16_t version = in.u16();
-  if (version != Protocol::kVersion) {
-    refuse("protocol version " + std::to_string(version) +
-               " is not supported; this server speaks " + std::to_string(Protocol::kVersion),
-           true);
-    return;
-  }
-  greeted_ = true;
-  FrameWriter out(MessageType::Welcome);
-  out.bytes(Protocol::kMagic, 4).u16(Protocol::kVersion);
-  out.u32(state_->options.maxFrameBytes).u32(state_->options.maxReadBytes);
-  send(out.text(boundedText(state_->options.name)).finish(), false);
 }
 
 void ServerConnection::runRequest(Frame frame) {

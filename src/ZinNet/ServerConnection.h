@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "Asio.h"
+#include "ConnectionRules.h"
 #include "Frame.h"
 #include "ServerState.h"
 
@@ -41,7 +42,6 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   void onPrefix(std::error_code ec, size_t n);
   void readBody(uint32_t length);
   void onFrame(Frame frame);
-  void onHello(const Frame& frame);
   void runRequest(Frame frame);
   void send(std::vector<unsigned char> bytes, bool thenClose);
   void lingerAndClose();
@@ -56,6 +56,7 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   asio::steady_timer timer_;
   asio::any_io_executor requests_;
   uint64_t id_;
+  ConnectionRules rules_;  // the greeting and the checks of each frame
   std::string peer_;
   uint64_t timerGeneration_ = 0;
   std::array<unsigned char, Protocol::kLengthBytes> prefix_{};
@@ -64,7 +65,6 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   std::vector<unsigned char> outgoing_;
   std::array<unsigned char, 4096> scratch_{};
   static constexpr uint32_t kLingerMs = 1000;
-  bool greeted_ = false;
   bool closed_ = false;
   bool leaving_ = false;     // a closing frame is being sent
   bool inExchange_ = false;  // a request is queued, carried out or answered

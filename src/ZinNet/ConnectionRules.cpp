@@ -1,0 +1,67 @@
+// The length limit, the greeting and the request check of a server connection.
+#include "ConnectionRules.h"
+
+#include <cstring>
+
+#include "RequestHandler.h"
+
+namespace ZinNet {
+
+using Protocol::MessageType;
+using Action = FrameOutcome::Action;
+
+namespace {
+
+FrameOutcome outcome(Action action, std::string why) {
+  FrameOutcome out;
+  out.action = action;
+  out.why = std::move(why);
+  return out;
+}
+
+}  // namespace
+
+std::string ConnectionRules::lengthProblem(uint32_t length) const {
+  if (length == 0) return "frame of length 0";
+  if (length > options_.maxFrameBytes) {
+    return "frame of " + std::to_string(length) + " bytes exceeds the limit of " +
+           std::to_string(options_.maxFrameBytes) + " bytes";
+  }
+  return {};
+}
+
+FrameOutcome ConnectionRules::onFrame(const Frame& frame) {
+  if (!greeted_) return onHello(frame);
+  if (frame.type == MessageType::Hello) return outcome(Action::Refuse, "hello sent twice");
+  if (!isRequest(frame.type)) {
+    return outcome(Action::Refuse,
+                   "unknown request type " + typeText(static_cast<uint8_t>(frame.type)));
+  }
+  return outcome(Action::Request, {});
+}
+
+FrameOutcome ConnectionRules::onHello(const Frame& frame) {
+  if (frame.type != MessageType::Hello) {
+    return outcome(Action::Close, "expected a hello frame first, got " +
+                                      typeText(static_cast<uint8_t>(frame.type)));
+  }
+  FrameReader in(frame, "hello");
+  if (in.remaining() != 6 || std::memcmp(in.bytes(4), Protocol::kMagic, 4) != 0) {
+    return outcome(Action::Close, "not a ZinNet hello");
+  }
+  const uint16_t version = in.u16();
+  if (version != Protocol::kVersion) {
+    return outcome(Action::Close, "protocol version " + std::to_string(version) +
+                                      " is not supported; this server speaks " +
+                                      std::to_string(Protocol::kVersion));
+  }
+  greeted_ = true;
+  FrameWriter welcome(MessageType::Welcome);
+  welcome.bytes(Protocol::kMagic, 4).u16(Protocol::kVersion);
+  welcome.u32(options_.maxFrameBytes).u32(options_.maxReadBytes);
+  FrameOutcome out = outcome(Action::Reply, {});
+  out.bytes = welcome.text(boundedText(options_.name)).finish();
+  return out;
+}
+
+}  // namespace ZinNet
