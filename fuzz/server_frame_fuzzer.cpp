@@ -52,7 +52,7 @@ Frame readReply(const Bytes& bytes) {
       decodeLength(bytes.data()) != bytes.size() - Protocol::kLengthBytes) {
     fail("a reply frame of " + std::to_string(bytes.size()) + " bytes has a wrong length prefix");
   }
-  return takeFrame(Bytes(bytes.begin() + Protocol::kLengthBytes, bytes.end()));
+  return frameOf(Bytes(bytes.begin() + Protocol::kLengthBytes, bytes.end()));
 }
 
 void checkText(const Frame& reply) {
@@ -117,7 +117,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     at += Protocol::kLengthBytes;
     if (!rules.lengthProblem(length).empty()) return 0;  // closing frame, connection closed
     if (length > size - at) return 0;                    // the stream ends inside the frame
-    Frame frame = takeFrame(Bytes(data + at, data + at + length));
+    Frame frame = frameOf(Bytes(data + at, data + at + length));
     at += length;
     if (!onFrame(rules, target, options, std::move(frame))) return 0;
   }

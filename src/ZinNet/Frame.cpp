@@ -92,7 +92,7 @@ void FrameReader::end() const {
   }
 }
 
-Frame takeFrame(std::vector<unsigned char> bytes) {
+Frame frameOf(std::vector<unsigned char> bytes) {
   if (bytes.empty()) throw FrameError("frame without a type byte");
   Frame frame;
   frame.type = static_cast<MessageType>(bytes.front());

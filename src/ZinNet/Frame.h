@@ -64,7 +64,7 @@ class FrameReader {
 
 /// The frame made of the bytes after a length prefix (at least one): the type byte, then the body.
 /// Throws FrameError when there is no type byte.
-Frame takeFrame(std::vector<unsigned char> bytes);
+Frame frameOf(std::vector<unsigned char> bytes);
 
 /// The frame length from the four prefix bytes.
 uint32_t decodeLength(const unsigned char* prefix);

@@ -141,7 +141,7 @@ void ServerConnection::readBody(uint32_t length) {
                      }
                      // The body moves on without a copy, and the buffer keeps no memory between
                      // frames.
-                     self->onFrame(takeFrame(std::exchange(self->body_, {})));
+                     self->onFrame(frameOf(std::exchange(self->body_, {})));
                    });
 }
 
