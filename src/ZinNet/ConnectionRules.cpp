@@ -1,6 +1,7 @@
 // The length limit, the greeting and the request check of a server connection.
 #include "ConnectionRules.h"
 
+#include <algorithm>
 #include <cstring>
 
 #include "RequestHandler.h"
@@ -23,9 +24,11 @@ FrameOutcome outcome(Action action, std::string why) {
 
 std::string ConnectionRules::lengthProblem(uint32_t length) const {
   if (length == 0) return "frame of length 0";
-  if (length > options_.maxFrameBytes) {
+  const uint32_t limit =
+      greeted_ ? options_.maxFrameBytes : std::min(options_.maxFrameBytes, kMaxGreetingFrameBytes);
+  if (length > limit) {
     return "frame of " + std::to_string(length) + " bytes exceeds the limit of " +
-           std::to_string(options_.maxFrameBytes) + " bytes";
+           std::to_string(limit) + " bytes" + (greeted_ ? "" : " before the greeting is done");
   }
   return {};
 }

@@ -33,11 +33,15 @@ class ConnectionRules {
   explicit ConnectionRules(const ServerOptions& options) : options_(options) {}
 
   /// Empty when a frame of `length` bytes (from its prefix) may be read, else why the
-  /// connection closes.
+  /// connection closes. Until the greeting is done only its small frames fit, so a stranger
+  /// cannot make the server set aside a large frame buffer before it has greeted.
   std::string lengthProblem(uint32_t length) const;
   /// The outcome of a complete frame: a valid first hello greets the connection.
   FrameOutcome onFrame(const Frame& frame);
   bool greeted() const { return greeted_; }
+
+  /// The largest frame taken before the greeting is done (a hello is 7 bytes).
+  static constexpr uint32_t kMaxGreetingFrameBytes = 64;
 
  private:
   FrameOutcome onHello(const Frame& frame);

@@ -101,6 +101,17 @@ TEST(Robustness, BadFramesGetARefusalOrAClosingFrame) {
     EXPECT_EQ(reply->text(), "protocol version 2 is not supported; this server speaks 1");
     EXPECT_TRUE(client.closedWithin(milliseconds(2000)));
   }
+  // Before the greeting, a frame longer than a greeting's is refused at its length.
+  for (const auto& [length, why] :
+       {std::pair<uint32_t, std::string>{64, "not a ZinNet hello"},
+        {65, "frame of 65 bytes exceeds the limit of 64 bytes before the greeting is done"}}) {
+    RawClient client(server.port());
+    client.send(concat({u32(length), Bytes(length, 0x01)}));
+    const auto reply = client.readFrame();
+    ASSERT_TRUE(reply.has_value());
+    EXPECT_EQ(reply->type, kClosing);
+    EXPECT_EQ(reply->text(), why);
+  }
   {
     // Within a connection, a well-delimited bad request is refused and the connection stays.
     RawClient client(server.port());
