@@ -71,7 +71,7 @@ std::string readFile(const std::string& path) {
   return text.str();
 }
 
-// Starts `path` with `args` and the file actions; throws when it cannot start.
+// Starts `path` with `args` and the file actions (which it destroys); -1 when it cannot start.
 pid_t spawn(const std::string& path, const std::vector<std::string>& args,
             posix_spawn_file_actions_t& actions) {
   std::vector<char*> argv{const_cast<char*>(path.c_str())};
@@ -80,8 +80,7 @@ pid_t spawn(const std::string& path, const std::vector<std::string>& args,
   pid_t pid = -1;
   const int rc = posix_spawn(&pid, path.c_str(), &actions, nullptr, argv.data(), environ);
   posix_spawn_file_actions_destroy(&actions);
-  if (rc != 0) throw std::runtime_error("cannot start " + path);
-  return pid;
+  return rc == 0 ? pid : -1;
 }
 
 // Waits for `pid` until `end`, killing it then; its wait status.
@@ -118,9 +117,10 @@ ProcessResult runProcess(const std::string& path, const std::vector<std::string>
   posix_spawn_file_actions_addopen(&actions, 0, in.c_str(), O_RDONLY, 0);
   posix_spawn_file_actions_addopen(&actions, 1, out.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
   posix_spawn_file_actions_addopen(&actions, 2, err.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
-  const int status =
-      reap(spawn(path, args, actions), Clock::now() + std::chrono::milliseconds(timeoutMs),
-           [] { std::this_thread::sleep_for(std::chrono::milliseconds(5)); });
+  const pid_t pid = spawn(path, args, actions);
+  if (pid < 0) throw std::runtime_error("cannot start " + path);
+  const int status = reap(pid, Clock::now() + std::chrono::milliseconds(timeoutMs),
+                          [] { std::this_thread::sleep_for(std::chrono::milliseconds(5)); });
   ProcessResult result;
   if (status == -1) result.signal = SIGKILL;
   if (status != -1 && WIFEXITED(status)) result.status = WEXITSTATUS(status);
@@ -137,15 +137,10 @@ ChildProcess::ChildProcess(const std::string& path, const std::vector<std::strin
   posix_spawn_file_actions_init(&actions);
   posix_spawn_file_actions_adddup2(&actions, fds[1], 1);
   posix_spawn_file_actions_adddup2(&actions, fds[1], 2);
-  out_ = fds[0];
-  try {
-    pid_ = spawn(path, args, actions);
-  } catch (...) {
-    close(fds[1]);
-    close(out_);
-    throw;
-  }
+  pid_ = spawn(path, args, actions);
   close(fds[1]);
+  out_ = fds[0];
+  if (pid_ < 0) throw std::runtime_error("cannot start " + path);
 }
 
 ChildProcess::~ChildProcess() {
