@@ -3,10 +3,7 @@ Session("tcp://HOST:PORT")."""
 
 import os
 import re
-import select
-import signal
 import subprocess
-import time
 
 import pytest
 
@@ -14,41 +11,25 @@ import zinmox
 from conftest import FULL
 
 
-class Server:
-    """`zinmox serve` on a free loopback port, in a child process."""
-
-    def __init__(self):
-        self.process = subprocess.Popen(
-            [os.environ["ZINMOX_TOOL"], "serve", "--listen", "127.0.0.1:0"],
-            stdout=subprocess.PIPE, stderr=subprocess.STDOUT)
-        self.target = None
-        output = b""
-        deadline = time.monotonic() + 20
-        while self.target is None and time.monotonic() < deadline:
-            ready, _, _ = select.select([self.process.stdout], [], [], 1.0)
-            if ready:
-                chunk = os.read(self.process.stdout.fileno(), 4096)
-                if not chunk:
-                    break
-                output += chunk
-                found = re.search(rb"tcp://127\.0\.0\.1:\d+", output)
-                self.target = found.group(0).decode() if found else None
-
-    def stop(self):
-        """SIGTERM; the server must stop cleanly."""
-        if self.process.poll() is None:
-            self.process.send_signal(signal.SIGTERM)
-        return self.process.wait(timeout=10)
+def stop(process):
+    """SIGTERM; the server must stop cleanly."""
+    if process.poll() is None:
+        process.terminate()
+    return process.wait(timeout=10)
 
 
 @pytest.fixture
 def server():
-    started = Server()
+    process = subprocess.Popen([os.environ["ZINMOX_TOOL"], "serve", "--listen", "127.0.0.1:0"],
+                               stdout=subprocess.PIPE, text=True)
     try:
-        assert started.target, "zinmox serve did not say where it listens"
-        yield started
+        found = next(filter(None, (re.search(r"tcp://127\.0\.0\.1:\d+", line)
+                                   for line in process.stdout)), None)
+        assert found, "zinmox serve did not say where it listens"
+        process.target = found.group(0)
+        yield process
     finally:
-        assert started.stop() == 0
+        assert stop(process) == 0
 
 
 def test_sessions_share_the_served_target_and_a_stopped_server_is_reported(server):
@@ -61,7 +42,7 @@ def test_sessions_share_the_served_target_and_a_stopped_server_is_reported(serve
         one.write(async_out_data=0xA5C3)
         assert two.read()["async_in_data"].value == 0xA5C3
         assert first.scan() == second.scan()
-        assert server.stop() == 0
+        assert stop(server) == 0
         with pytest.raises(zinmox.Error, match="cannot connect to 127.0.0.1"):
             one.write(async_out_data=2)
     with pytest.raises(ConnectionError, match="cannot connect to 127.0.0.1"):

@@ -62,12 +62,6 @@ class HubClient {
  public:
   HubClient(Bench& bench, uint32_t waitBits = 64) : bench_(bench), wait_(waitBits) {}
 
-  static Bits header(uint32_t op, uint32_t core) {
-    Bits h;
-    ZinHub::appendHeader(h, static_cast<ZinHub::HubOp>(op), core);
-    return h;
-  }
-
   // One DR scan of the given TDI bits; returns everything TDO gave.
   Bits raw(const Bits& in, size_t stopAfter = SIZE_MAX) {
     Bits out = bench_.dr(in, stopAfter);
@@ -75,7 +69,8 @@ class HubClient {
     return out;
   }
   Bits scan(uint32_t op, uint32_t core, const Bits& payload, size_t stopAfter = SIZE_MAX) {
-    Bits in = header(op, core);
+    Bits in;
+    ZinHub::appendHeader(in, static_cast<ZinHub::HubOp>(op), core);
     in.insert(in.end(), payload.begin(), payload.end());
     return raw(in, stopAfter);
   }
