@@ -1,5 +1,5 @@
-"""Sessions on a target server: `zinmox serve` in a child process, reached with
-Session("tcp://HOST:PORT")."""
+"""`zinmox serve` in a child process holds the target for several clients: Python sessions with
+Session("tcp://HOST:PORT") and `zinmox --target tcp://HOST:PORT` processes."""
 
 import os
 import re
@@ -10,31 +10,37 @@ import pytest
 import zinmox
 from conftest import FULL
 
+TOOL = os.environ["ZINMOX_TOOL"]
+
+
+def tool(*args):
+    return subprocess.run([TOOL, *args], capture_output=True, text=True, timeout=60, check=False)
+
 
 def stop(process):
-    """SIGTERM; the server must stop cleanly."""
+    """SIGTERM; the server must stop cleanly and say so."""
     if process.poll() is None:
         process.terminate()
-    return process.wait(timeout=10)
+    assert process.wait(timeout=10) == 0
+    assert "stopping on SIGTERM" in process.stdout.read()
 
 
 @pytest.fixture
 def server():
-    process = subprocess.Popen([os.environ["ZINMOX_TOOL"], "serve", "--listen", "127.0.0.1:0"],
+    process = subprocess.Popen([TOOL, "serve", "--listen", "127.0.0.1:0"],
                                stdout=subprocess.PIPE, text=True)
     try:
-        found = next(filter(None, (re.search(r"tcp://127\.0\.0\.1:\d+", line)
-                                   for line in process.stdout)), None)
-        assert found, "zinmox serve did not say where it listens"
+        lines = process.stdout.readline() + process.stdout.readline()  # listening, serving
+        found = re.search(r"tcp://127\.0\.0\.1:\d+", lines)
+        assert found and "loopback only" in lines, lines
         process.target = found.group(0)
         yield process
     finally:
-        assert stop(process) == 0
+        if process.poll() is None:
+            stop(process)
 
 
-def test_sessions_share_the_served_target_and_a_stopped_server_is_reported(server):
-    with pytest.raises(ValueError, match="is not HOST:PORT"):
-        zinmox.Session("tcp://127.0.0.1")
+def test_sessions_and_tool_processes_share_the_served_target(server):
     with zinmox.Session(server.target) as first, zinmox.Session(server.target) as second:
         assert first.target is None  # not a simulated target of this process
         one = first.core(FULL).init()
@@ -42,8 +48,16 @@ def test_sessions_share_the_served_target_and_a_stopped_server_is_reported(serve
         one.write(async_out_data=0xA5C3)
         assert two.read()["async_in_data"].value == 0xA5C3
         assert first.scan() == second.scan()
-        assert stop(server) == 0
+        written = tool("--target", server.target, "write", FULL, "async_out_data=5AC3")
+        assert written.returncode == 0, written.stderr
+        assert one.read()["async_in_data"].value == 0x5AC3
+        read = tool("--target", server.target, "read", FULL, "async_in_data")
+        assert read.returncode == 0 and "5AC3" in read.stdout, read.stderr
+        # A stopped server is reported by both clients.
+        stop(server)
         with pytest.raises(zinmox.Error, match="cannot connect to 127.0.0.1"):
             one.write(async_out_data=2)
     with pytest.raises(ConnectionError, match="cannot connect to 127.0.0.1"):
         zinmox.Session(server.target)
+    late = tool("--target", server.target, "scan")
+    assert late.returncode == 1 and "cannot connect to 127.0.0.1" in late.stderr
