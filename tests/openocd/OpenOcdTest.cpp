@@ -108,9 +108,12 @@ struct Host {
   }
   ~Host() { ZinJtag_closeSession(handle); }
 
-  std::string text(uint32_t rc, const ZinMOX_ValueMap& values) {
+  // The return code and the value map after a call of getCoreInfo, writeValues or readValues.
+  std::string call(uint32_t (*function)(uint32_t, ZIN_CORE_REF*, uintptr_t*), ZIN_CORE_REF ref,
+                   ZinMOX_ValueMap values = {}) {
+    uintptr_t word = reinterpret_cast<uintptr_t>(&values);
     std::ostringstream out;
-    out << "rc " << rc;
+    out << "rc " << function(handle, &ref, &word);
     for (const auto& [key, value] : values) out << " " << key << "=" << value;
     return out.str();
   }
@@ -121,20 +124,6 @@ struct Host {
     for (const auto& r : refs)
       out += std::to_string(r.userChainNumber) + ":" + std::to_string(r.coreIndex) + " ";
     return out;
-  }
-  std::string info(ZIN_CORE_REF ref) {
-    ZinMOX_ValueMap values;
-    uintptr_t word = reinterpret_cast<uintptr_t>(&values);
-    return text(ZinMOX_getCoreInfo(handle, &ref, &word), values);
-  }
-  std::string write(ZIN_CORE_REF ref, ZinMOX_ValueMap values) {
-    uintptr_t word = reinterpret_cast<uintptr_t>(&values);
-    return text(ZinMOX_writeValues(handle, &ref, &word), {});
-  }
-  std::string read(ZIN_CORE_REF ref) {
-    ZinMOX_ValueMap values;
-    uintptr_t word = reinterpret_cast<uintptr_t>(&values);
-    return text(ZinMOX_readValues(handle, &ref, &word), values);
   }
   std::string ports(ZIN_CORE_REF ref, uint8_t async) {
     const uint8_t mask = 0xFF;
@@ -153,7 +142,8 @@ struct Host {
 // each giving a text that must be the same on both targets.
 std::vector<std::string> exercise(Host& host) {
   std::vector<std::string> out{host.scan()};
-  for (uint32_t core = 0; core < 4; ++core) out.push_back(host.info({0, 1, core}));
+  for (uint32_t core = 0; core < 4; ++core)
+    out.push_back(host.call(ZinMOX_getCoreInfo, {0, 1, core}));
   ZIN_CORE_REF ref{0, 1, 1};
   out.push_back(std::to_string(ZinMOX_initCore(host.handle, &ref)));
   const uint32_t bits[] = {0, 1, 2, 3, 4, 5, 6, 7};
@@ -161,17 +151,17 @@ std::vector<std::string> exercise(Host& host) {
   ZinMOX_defineBus(host.handle, &ref, "in", ZINMOX_ASYNC_INPUT, bits, 8);
   ZinMOX_defineSignal(host.handle, &ref, "s", ZINMOX_SYNC_OUTPUT, 0);
   ZinMOX_defineSignal(host.handle, &ref, "sin", ZINMOX_SYNC_INPUT, 0);
-  host.write(ref, {{"out", "00"}, {"s.pulsetrain", "0000"}});
-  host.read(ref);  // clears what earlier runs left in the latches
+  host.call(ZinMOX_writeValues, ref, {{"out", "00"}, {"s.pulsetrain", "0000"}});
+  host.call(ZinMOX_readValues, ref);  // clears what earlier runs left in the latches
   for (const char* value : {"5A", "0F", "F0"}) {
-    out.push_back(host.write(ref, {{"out", value}}));
-    out.push_back(host.read(ref));
+    out.push_back(host.call(ZinMOX_writeValues, ref, {{"out", value}}));
+    out.push_back(host.call(ZinMOX_readValues, ref));
   }
   out.push_back(host.ports(ref, 0xC3));
   out.push_back(host.ports(ref, 0x3C));
   for (const char* train : {"FFFF", "0000"}) {
-    out.push_back(host.write(ref, {{"s.pulsetrain", train}}));
-    out.push_back(host.read(ref));
+    out.push_back(host.call(ZinMOX_writeValues, ref, {{"s.pulsetrain", train}}));
+    out.push_back(host.call(ZinMOX_readValues, ref));
   }
   return out;
 }

@@ -2,6 +2,7 @@
 #include <gtest/gtest.h>
 
 #include <fstream>
+#include <optional>
 
 #include "SimTestUtil.h"
 #include "ZinSim/DescriptionJson.h"
@@ -13,6 +14,17 @@ using ZinSim::DescriptionError;
 // A description with one chain whose first core is `core` (JSON text).
 std::string withCore(const std::string& core) {
   return R"({"devices": [{"index": 1, "chains": [{"number": 2, "cores": [)" + core + "]}]}]}";
+}
+
+// The description error that `call` throws, if any.
+template <class Call>
+std::optional<DescriptionError> errorOf(Call&& call) {
+  try {
+    call();
+  } catch (const DescriptionError& e) {
+    return e;
+  }
+  return std::nullopt;
 }
 
 TEST(Description, EveryProblemIsNamedByItsPointer) {
@@ -94,17 +106,13 @@ TEST(Description, EveryProblemIsNamedByItsPointer) {
       {withCore(R"({"status": "01"})"), core + "/status", "built from its widths"},
   };
   for (const Case& c : cases) {
-    SCOPED_TRACE(c.json);
-    try {
-      ZinSim::parseDescription(c.json);
-      ADD_FAILURE() << "accepted";
-    } catch (const DescriptionError& e) {
-      EXPECT_EQ(e.pointer(), c.pointer) << e.what();
-      EXPECT_NE(e.problem().find(c.problem), std::string::npos) << e.what();
-      const std::string shown = c.pointer.empty() ? "(description)" : c.pointer;
-      EXPECT_EQ(std::string(e.what()).rfind(shown + ": ", 0), 0u) << e.what();
-      EXPECT_LT(e.problem().size(), 200u);
-    }
+    const auto e = errorOf([&] { ZinSim::parseDescription(c.json); });
+    ASSERT_TRUE(e) << "accepted " << c.json;
+    EXPECT_EQ(e->pointer(), c.pointer) << e->what();
+    EXPECT_NE(e->problem().find(c.problem), std::string::npos) << e->what();
+    const std::string shown = c.pointer.empty() ? "(description)" : c.pointer;
+    EXPECT_EQ(std::string(e->what()).rfind(shown + ": ", 0), 0u) << e->what();
+    EXPECT_LT(e->problem().size(), 200u);
   }
 }
 
@@ -114,25 +122,18 @@ TEST(Description, FilesAndDescriptionsBuiltInCode) {
     std::ofstream file(path);
     file << withCore(R"({"async_outputs": 70000})");
   }
-  try {
-    ZinSim::loadDescription(path);
-    ADD_FAILURE() << "accepted";
-  } catch (const DescriptionError& e) {
-    EXPECT_EQ(e.pointer(), "/devices/0/chains/0/cores/0/async_outputs");
-    EXPECT_NE(std::string(e.what()).find(path), std::string::npos) << e.what();
-  }
-  EXPECT_THROW(ZinSim::loadDescription(path + ".missing"), DescriptionError);
-
+  auto e = errorOf([&] { ZinSim::loadDescription(path); });
+  ASSERT_TRUE(e);
+  EXPECT_EQ(e->pointer(), "/devices/0/chains/0/cores/0/async_outputs");
+  EXPECT_NE(std::string(e->what()).find(path), std::string::npos) << e->what();
+  EXPECT_TRUE(errorOf([&] { ZinSim::loadDescription(path + ".missing"); }));
   ZinSim::TargetDescription twice;
   twice.cores = {ZinSimTest::moxCore({0, 1, 2}, 1, 1, 1, 1),
                  ZinSimTest::moxCore({0, 1, 2}, 1, 1, 1, 1)};
-  try {
-    ZinSim::Target target(twice);
-    ADD_FAILURE() << "accepted";
-  } catch (const DescriptionError& e) {
-    EXPECT_EQ(e.pointer(), "/cores/1");
-    EXPECT_EQ(e.problem(), "device 00 chain 1 core 2 is described twice");
-  }
+  e = errorOf([&] { ZinSim::Target target(twice); });
+  ASSERT_TRUE(e);
+  EXPECT_EQ(e->pointer(), "/cores/1");
+  EXPECT_EQ(e->problem(), "device 00 chain 1 core 2 is described twice");
   ZinSim::TargetDescription wide;
   wide.cores = {ZinSimTest::moxCore({0, 0, 16}, 1, 1, 1, 1)};
   EXPECT_THROW(ZinSim::Target{wide}, DescriptionError);
