@@ -1,20 +1,8 @@
 // The RTL loopback design against the simulated target: the same random command sequences go to
-// both, and read data and output levels must be identical at every observation point.
-//
-// Observation points. The RTL's design clock runs free during scans, so the two models agree
-// only once every effect of a sequence has settled, not cycle by cycle:
-// - Write sequences (stage 01 + commit 02, or either alone) and read sequences (capture 03, then
-//   clear 04 or not, or a clear alone) stay separate, as the library sends them.
-// - After every sequence both models let enough design cycles pass for any pulse train to reach
-//   its held last step (the simulated target: `advance`; the RTL: design clock cycles with the
-//   JTAG pins still). Then the output levels are compared.
-// - Read data is compared for every capture. Because the models are settled before each read,
-//   values and activity latches (which record every change since the last clear, pulse-train
-//   steps included) must match bit for bit.
-// Status reads of both are compared once per configuration.
-//
-// ZINMOX_RTL_DIFF_SEQUENCES (default 150 per configuration) and ZINMOX_RTL_DIFF_SEED (default
-// 1) choose a longer or another run.
+// both, and once both have settled after each sequence (the RTL's design clock runs during the
+// scans, so they agree only then), read data and output levels must be identical; status reads
+// are compared once per configuration (docs/rtlsim.md). ZINMOX_RTL_DIFF_SEQUENCES (default 150 per
+// configuration) and ZINMOX_RTL_DIFF_SEED (default 1) choose a longer or another run.
 #include <gtest/gtest.h>
 
 #include <algorithm>

@@ -5,7 +5,7 @@
 #include <random>
 #include <string>
 
-#include "HubClient.h"
+#include "PinBench.h"
 #include "Vzinmox_demo_top.h"
 
 namespace RtlTest {

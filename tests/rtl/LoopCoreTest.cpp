@@ -3,7 +3,7 @@
 // leave are the differential test's, tests/rtl-diff.)
 #include <gtest/gtest.h>
 
-#include "HubClient.h"
+#include "PinBench.h"
 #include "Vzinmox_loop_top.h"
 
 namespace RtlTest {

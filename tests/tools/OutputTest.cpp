@@ -133,7 +133,9 @@ TEST(Demo, ShowsTheDemoDesignAndItsLoopback) {
     EXPECT_EQ(std::stoi(counts[i].at(2), nullptr, 16),
               (std::stoi(counts[i - 1].at(2), nullptr, 16) + 1) % 16)
         << "read " << i;
-    if (i >= 3) EXPECT_NE(counts[i].at(3).find('*'), std::string::npos) << "read " << i;
+    if (i >= 3) {
+      EXPECT_NE(counts[i].at(3).find('*'), std::string::npos) << "read " << i;
+    }
   }
 }
 
