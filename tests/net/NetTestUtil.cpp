@@ -126,11 +126,13 @@ bool RawClient::closedWithin(std::chrono::milliseconds limit) {
   return ended_;
 }
 
-void RawClient::greet() {
-  send(hello());
+void RawClient::greet(uint16_t version) {
+  send(hello(version));
   const std::optional<RawFrame> welcome = readFrame();
   ASSERT_TRUE(welcome.has_value());
   ASSERT_EQ(welcome->type, 0x81);
+  ASSERT_GE(welcome->body.size(), 6u);
+  EXPECT_EQ((welcome->body[4] << 8) | welcome->body[5], version);
 }
 
 }  // namespace ZinNetTest

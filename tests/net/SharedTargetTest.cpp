@@ -101,31 +101,37 @@ TEST(SharedTarget, TargetFailuresArriveWithTheTargetsOwnText) {
   EXPECT_THROW(transport->commandSequence("00 1 0 07 0 00000004 0", nullptr, 0),
                ZinNet::TargetError);
   EXPECT_EQ(transport->serverName(), "ZinNet target server");
-}
-
-TEST(SharedTarget, UnreachableServerFailsTheOpenWithAClearText) {
-  uint16_t port = 0;
-  {
-    TestServer gone(std::make_shared<ZinSim::Target>());
-    port = gone.port();
+  // Version 2 folds the flush into the write: a failed sequence skips it, a good one flushes.
+  EXPECT_EQ(transport->protocolVersion(), 2u);
+  EXPECT_NO_THROW(transport->ping());
+  const uint64_t flushes = target->flushCount();
+  target->failNextTransfer("ZinSim test: folded");
+  try {
+    transport->commandSequenceThenFlush("00 1 0 02 0 00000004 0", nullptr, 0);
+    ADD_FAILURE() << "no failure";
+  } catch (const ZinNet::TargetError& e) {
+    EXPECT_STREQ(e.what(), "ZinSim test: folded");
   }
-  EXPECT_EQ(ZinNet_openSession("127.0.0.1", port, 500), 0u);
-  EXPECT_NE(std::string(ZinNet_lastError()).find("cannot connect to 127.0.0.1:"), std::string::npos)
-      << ZinNet_lastError();
-  EXPECT_EQ(ZinNet_openSession(nullptr, port, 500), 0u);
-  EXPECT_EQ(ZinNet_openSession("127.0.0.1", 0, 500), 0u);
-  EXPECT_STREQ(ZinNet_lastError(), "ZinNet_openSession: port 0");
+  EXPECT_EQ(target->flushCount(), flushes);
+  transport->commandSequenceThenFlush("00 1 0 02 0 00000004 0", nullptr, 0);
+  EXPECT_EQ(target->flushCount(), flushes + 1);
 }
 
 TEST(SharedTarget, ALostConnectionFailsTheCallAndTheNextCallReconnects) {
   auto target = std::make_shared<ZinSim::Target>();
   auto first = std::make_unique<TestServer>(target);
   const uint16_t port = first->port();
+  EXPECT_EQ(ZinNet_openSession(nullptr, port, 500), 0u);
+  EXPECT_EQ(ZinNet_openSession("127.0.0.1", 0, 500), 0u);
+  EXPECT_STREQ(ZinNet_lastError(), "ZinNet_openSession: port 0");
   Client a(port);
   ASSERT_EQ(ZinMOX_initCore(a.handle, &kFull), ZINMOX_SUCCESS);
   ASSERT_EQ(a.write("async_out_data", "00FF"), ZINMOX_SUCCESS);
 
-  first.reset();  // the server goes away: the call in progress fails
+  first.reset();  // the server goes away: the call in progress fails, and so does an open
+  EXPECT_EQ(ZinNet_openSession("127.0.0.1", port, 500), 0u);
+  EXPECT_NE(std::string(ZinNet_lastError()).find("cannot connect to 127.0.0.1:"), std::string::npos)
+      << ZinNet_lastError();
   EXPECT_EQ(a.write("async_out_data", "0F0F"), ZINMOX_FAILURE);
   const std::vector<std::string> messages = a.takeMessages();
   ASSERT_EQ(messages.size(), 1u);
@@ -217,3 +223,43 @@ TEST(SharedTarget, LimitsAreCheckedBeforeSending) {
 }
 
 }  // namespace
+
+// A server of the oldest version, by hand: it refuses the newer hello as such a server does,
+// welcomes the second one, and answers a command sequence and a flush.
+TEST(SharedTarget, AClientFallsBackToAVersion1Server) {
+  using namespace ZinNetTest;
+  asio::io_context io;
+  asio::ip::tcp::acceptor acceptor(io, {asio::ip::make_address("127.0.0.1"), 0});
+  std::vector<uint8_t> types;  // of every frame the server received
+  std::thread fake([&] {
+    auto next = [&](asio::ip::tcp::socket& socket) {
+      unsigned char prefix[4];
+      asio::read(socket, asio::buffer(prefix));
+      Bytes body((prefix[2] << 8) | prefix[3]);
+      asio::read(socket, asio::buffer(body));
+      types.push_back(body[0]);
+      return body;
+    };
+    asio::ip::tcp::socket first = acceptor.accept();
+    next(first);
+    asio::write(
+        first, asio::buffer(frame(kClosing, text("protocol version 2 is not supported; this server "
+                                                 "speaks 1"))));
+    asio::ip::tcp::socket second = acceptor.accept();
+    const Bytes hello = next(second);
+    asio::write(second, asio::buffer(frame(
+                            0x81, concat({text("ZNET"), {0, 1}, u32(64), u32(8), text("old")}))));
+    for (uint8_t reply : {kReadData, uint8_t{0x84}}) {
+      next(second);
+      asio::write(second, asio::buffer(frame(reply)));
+    }
+    EXPECT_EQ(hello, concat({{0x01}, text("ZNET"), {0, 1}}));
+  });
+  ZinNet::TcpTransport transport("127.0.0.1", acceptor.local_endpoint().port());
+  transport.commandSequenceThenFlush("x", nullptr, 0);
+  EXPECT_EQ(transport.protocolVersion(), 1u);
+  EXPECT_EQ(transport.serverName(), "old");
+  EXPECT_THROW(transport.ping(), ZinNet::NetError);
+  fake.join();
+  EXPECT_EQ(types, (std::vector<uint8_t>{0x01, 0x01, kSequence, 0x04}));
+}
