@@ -47,7 +47,7 @@ def server(zinmox, target=None):
                                text=True)
     try:
         first = process.stdout.readline()
-        match = re.search(r"tcp://127\.0\.0\.1:(\d+)", first)
+        match = re.search(r"127\.0\.0\.1:(\d+)", first)
         if not match:
             raise RuntimeError("zinmox serve did not start: " + first.strip())
         # Keep reading its log, so that the server never blocks on a full pipe.
