@@ -2,8 +2,10 @@
 //
 //   zin_net_bench latency PORT CALLS   p50 and p99 of a ping and of four library calls on the
 //                                      demo design's small core, interleaved
-//   zin_net_bench load PORT BIT SECONDS  write-and-read pairs on output bit BIT of core 0:1:0,
-//                                      each read checked against the write before it; prints
+//   zin_net_bench load PORT BIT SECONDS START_MS
+//                                      from START_MS (ms since the epoch), write-and-read pairs
+//                                      on output bit BIT of core 0:1:0 for SECONDS, each read
+//                                      checked against the write before it; prints
 //                                      "CALLS MISMATCHES"
 #include <algorithm>
 #include <chrono>
@@ -12,6 +14,7 @@
 #include <functional>
 #include <memory>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "ZinMOX/ZinMOX.h"
@@ -120,12 +123,16 @@ int latency(uint16_t port, int calls) {
   return 0;
 }
 
-int load(uint16_t port, uint32_t bit, double seconds) {
+int load(uint16_t port, uint32_t bit, double seconds, long long startMs) {
   Session s(port);
   ZIN_CORE_REF ref{0, 1, 0};
   defineBit(s.handle, &ref, bit);
   uint64_t calls = 0;
   uint64_t mismatches = 0;
+  // All clients start at the same wall-clock time, so that each one's calls count against the
+  // same period of load.
+  const std::chrono::system_clock::time_point start{std::chrono::milliseconds(startMs)};
+  std::this_thread::sleep_until(start);
   const auto end = Clock::now() + std::chrono::duration<double>(seconds);
   for (uint64_t i = bit; Clock::now() < end; ++i) {
     const char* value = i % 2 ? "1" : "0";
@@ -143,12 +150,12 @@ int load(uint16_t port, uint32_t bit, double seconds) {
 int main(int argc, char** argv) {
   const std::string mode = argc > 1 ? argv[1] : "";
   if (mode == "latency" && argc == 4) return latency(std::atoi(argv[2]), std::atoi(argv[3]));
-  if (mode == "load" && argc == 5) {
-    return load(std::atoi(argv[2]), std::atoi(argv[3]), std::atof(argv[4]));
+  if (mode == "load" && argc == 6) {
+    return load(std::atoi(argv[2]), std::atoi(argv[3]), std::atof(argv[4]), std::atoll(argv[5]));
   }
   std::fprintf(stderr,
                "usage: zin_net_bench latency PORT CALLS\n"
-               "       zin_net_bench load PORT BIT SECONDS\n"
+               "       zin_net_bench load PORT BIT SECONDS START_MS\n"
                "Run through scripts/net_bench.py, which starts the server.\n");
   return 2;
 }

@@ -29,6 +29,7 @@ import subprocess
 import sys
 import tempfile
 import threading
+import time
 
 ROOT = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
 
@@ -83,8 +84,10 @@ def load(args, zinmox, client):
             if not 1 <= count <= 64:
                 sys.exit("--clients: each count must be 1 to 64 (one output bit each)")
             with server(zinmox, description) as port:
+                # Every client connects first, then all start at once.
+                start_ms = int((time.time() + 2 + 0.05 * count) * 1000)
                 clients = [subprocess.Popen([client, "load", str(port), str(bit),
-                                             str(args.seconds)],
+                                             str(args.seconds), str(start_ms)],
                                             stdout=subprocess.PIPE, stderr=subprocess.PIPE,
                                             text=True) for bit in range(count)]
                 results = []
