@@ -229,17 +229,10 @@ TEST(Robustness, TheFuzzCorpusNeverCrashesOrHangsTheServer) {
     const int edits = 1 + static_cast<int>(rng() % 4);
     for (int e = 0; e < edits && !bytes.empty(); ++e) {
       const size_t at = rng() % bytes.size();
-      switch (rng() % 3) {
-        case 0:
-          bytes[at] ^= static_cast<unsigned char>(1u << (rng() % 8));
-          break;
-        case 1:
-          bytes.erase(bytes.begin() + static_cast<long>(at));
-          break;
-        default:
-          bytes.insert(bytes.begin() + static_cast<long>(at), bytes[at]);
-          break;
-      }
+      const auto kind = rng() % 3;
+      if (kind == 0) bytes[at] ^= static_cast<unsigned char>(1u << (rng() % 8));
+      if (kind == 1) bytes.erase(bytes.begin() + static_cast<long>(at));
+      if (kind == 2) bytes.insert(bytes.begin() + static_cast<long>(at), bytes[at]);
     }
     expectAnsweredAndClosed(server, bytes, "mutation " + std::to_string(round));
   }
