@@ -1,9 +1,11 @@
-// Sessions of several clients on one served target, through the exported ZinMOX functions, and
-// the life of a client connection: connect errors, timeouts, loss and reconnection.
+// Sessions of several clients on one served target, through the exported ZinMOX functions; the
+// life of a client connection (connect errors, timeouts, loss, reconnection, an older server);
+// and concurrent clients' requests, which never interleave.
 #include <gtest/gtest.h>
 
 #include <atomic>
 #include <future>
+#include <mutex>
 #include <thread>
 
 #include "NetTestUtil.h"
@@ -57,11 +59,14 @@ class Client {
   std::vector<std::string> messages;
 };
 
-TEST(SharedTarget, ClientsShareWritesAndSeeTargetFailuresOnTheirOwnCall) {
+// Clients share the target's state; a target failure arrives on the call that caused it, with the
+// target's own text; a lost server fails the call, and the next call connects again.
+TEST(SharedTarget, ClientsShareOneTargetAndItsFailures) {
   auto target = std::make_shared<ZinSim::Target>();
-  TestServer server(target);
-  Client a(server.port());
-  Client b(server.port());
+  auto server = std::make_unique<TestServer>(target);
+  const uint16_t port = server->port();
+  Client a(port);
+  Client b(port);
   ASSERT_EQ(ZinMOX_initCore(a.handle, &kFull), ZINMOX_SUCCESS);
   ASSERT_EQ(ZinMOX_initCore(b.handle, &kFull), ZINMOX_SUCCESS);
 
@@ -79,18 +84,17 @@ TEST(SharedTarget, ClientsShareWritesAndSeeTargetFailuresOnTheirOwnCall) {
 
   // The status read, the core list and the flushes went over the wire too.
   EXPECT_EQ(target->flushCount(), 2u);
-  EXPECT_GE(server.server().stats().requestsServed, 6u);  // each write is one request
-  EXPECT_EQ(server.server().stats().connectionsOpen, 2u);
+  EXPECT_GE(server->server().stats().requestsServed, 6u);  // each write is one request
+  EXPECT_EQ(server->server().stats().connectionsOpen, 2u);
 
   // A target failure of a write arrives with the target's own text and keeps the connection.
   target->failNextTransfer("ZinSim test: cable unplugged");
   EXPECT_EQ(a.write("async_out_data", "FFFF"), ZINMOX_FAILURE);
   EXPECT_EQ(a.takeMessages(), std::vector<std::string>{"ZinSim test: cable unplugged"});
-  // A target failure leaves the connection in use.
   EXPECT_EQ(a.write("async_out_data", "0001"), ZINMOX_SUCCESS);
-  EXPECT_EQ(server.server().stats().connectionsAccepted, 2u);
+  EXPECT_EQ(server->server().stats().connectionsAccepted, 2u);
 
-  auto transport = std::make_shared<ZinNet::TcpTransport>("127.0.0.1", server.port());
+  auto transport = std::make_shared<ZinNet::TcpTransport>("127.0.0.1", port);
   std::vector<ZIN_CORE_REF> refs;
   ASSERT_TRUE(transport->listCores(refs));
   EXPECT_EQ(refs.size(), target->description().cores.size());
@@ -111,20 +115,12 @@ TEST(SharedTarget, ClientsShareWritesAndSeeTargetFailuresOnTheirOwnCall) {
   EXPECT_EQ(target->flushCount(), flushes);
   transport->commandSequenceThenFlush("00 1 0 02 0 00000004 0", nullptr, 0);
   EXPECT_EQ(target->flushCount(), flushes + 1);
-}
 
-TEST(SharedTarget, ALostConnectionFailsTheCallAndTheNextCallReconnects) {
-  auto target = std::make_shared<ZinSim::Target>();
-  auto first = std::make_unique<TestServer>(target);
-  const uint16_t port = first->port();
   EXPECT_EQ(ZinNet_openSession(nullptr, port, 500), 0u);
   EXPECT_EQ(ZinNet_openSession("127.0.0.1", 0, 500), 0u);
   EXPECT_STREQ(ZinNet_lastError(), "ZinNet_openSession: port 0");
-  Client a(port);
-  ASSERT_EQ(ZinMOX_initCore(a.handle, &kFull), ZINMOX_SUCCESS);
-  ASSERT_EQ(a.write("async_out_data", "00FF"), ZINMOX_SUCCESS);
 
-  first.reset();  // the server goes away: the call in progress fails, and so does an open
+  server.reset();  // the server goes away: the call in progress fails, and so does an open
   EXPECT_EQ(ZinNet_openSession("127.0.0.1", port, 500), 0u);
   EXPECT_NE(std::string(ZinNet_lastError()).find("cannot connect to 127.0.0.1:"), std::string::npos)
       << ZinNet_lastError();
@@ -213,6 +209,84 @@ TEST(SharedTarget, LimitsTimeoutsAndAServerGoingAway) {
       << lost;
   stopper.join();
   holder.join();
+}
+
+// Requests of concurrent clients are carried out one at a time and whole, in each client's order,
+// whether the server runs them on its I/O thread or hands them to its request thread.
+// Records every sequence and notices two calls inside it at once.
+class RecordingTransport : public ZinRT::Zin_Transport {
+ public:
+  void readStatus(const ZIN_CORE_REF&, ZIN_CORE_INFO&, unsigned char*, uint32_t,
+                  uint32_t) override {}
+  void commandSequence(const std::string& text, unsigned char* data, uint32_t bits) override {
+    if (inside_.fetch_add(1) != 0) ++overlaps;
+    std::this_thread::sleep_for(std::chrono::microseconds(200));
+    {
+      std::lock_guard<std::mutex> lock(mutex_);
+      texts.push_back(text);
+    }
+    // Answer with the text's last byte in every read byte, so clients can check their answer.
+    for (uint32_t i = 0; i < (bits + 7) / 8; ++i) data[i] = static_cast<unsigned char>(text.back());
+    --inside_;
+  }
+  void flush() override {
+    if (inside_ != 0) ++overlaps;
+  }
+
+  std::vector<std::string> texts;
+  std::atomic<int> overlaps{0};
+
+ private:
+  std::atomic<int> inside_{0};
+  std::mutex mutex_;
+};
+
+TEST(Interleave, ConcurrentClientsSequencesNeverInterleave) {
+  auto recorder = std::make_shared<RecordingTransport>();
+  ZinNetTest::TestServer server(recorder);
+  constexpr int kClients = 6;
+  constexpr int kSequences = 40;
+  std::atomic<int> wrongAnswers{0};
+  std::vector<std::thread> threads;
+  for (int c = 0; c < kClients; ++c) {
+    threads.emplace_back([&, c] {
+      ZinNet::TcpTransport transport("127.0.0.1", server.port(), {2000, 5000});
+      for (int i = 0; i < kSequences; ++i) {
+        // A multi-line sequence; every third one is over 64 KiB, for the request thread.
+        std::string text;
+        const int lines = i % 3 == 0 ? 600 : 50;
+        for (int line = 0; line < lines; ++line) {
+          text += "client " + std::to_string(c) + " sequence " + std::to_string(i) + " line " +
+                  std::to_string(line) + std::string(100, 'x') + "\n";
+        }
+        text += static_cast<char>('A' + c);
+        unsigned char answer[3] = {0, 0, 0};
+        if (i % 2 == 0) {
+          transport.commandSequence(text, answer, 24);
+        } else {
+          transport.commandSequenceThenFlush(text, answer, 24);
+        }
+        if (answer[0] != 'A' + c || answer[2] != 'A' + c) ++wrongAnswers;
+      }
+    });
+  }
+  for (std::thread& t : threads) t.join();
+
+  EXPECT_EQ(recorder->overlaps, 0);
+  EXPECT_EQ(wrongAnswers, 0);
+  ASSERT_EQ(recorder->texts.size(), size_t{kClients * kSequences});
+  // Each text arrived whole, and each client's sequences in the order sent.
+  std::vector<int> next(kClients, 0);
+  for (const std::string& text : recorder->texts) {
+    const int c = text.back() - 'A';
+    ASSERT_TRUE(c >= 0 && c < kClients);
+    const int i = next[c]++;
+    const std::string head = "client " + std::to_string(c) + " sequence " + std::to_string(i);
+    EXPECT_EQ(text.rfind(head + " line 0", 0), 0u) << text.substr(0, 40);
+    const std::string last = (i % 3 == 0 ? " line 599" : " line 49") + std::string(100, 'x');
+    EXPECT_EQ(text.substr(text.size() - last.size() - 2, last.size()), last);
+  }
+  EXPECT_EQ(next, std::vector<int>(kClients, kSequences));
 }
 
 }  // namespace
