@@ -35,6 +35,7 @@ size_t expectedReply(const Frame& request, const Frame& reply, MessageType& type
       type = MessageType::Status;
       return 20 + size_t{u32At(request.body, 12)};
     case MessageType::CommandSequence:
+    case MessageType::SequenceAndFlush:
       type = MessageType::ReadData;
       return (size_t{u32At(request.body, 0)} + 7) / 8;
     case MessageType::Flush:
@@ -83,16 +84,26 @@ void checkReply(const Frame& request, const Reply& outcome) {
   }
 }
 
+// What the connection answers by itself: a welcome of the version asked for, then pongs.
+void checkAnswer(const Frame& reply, bool greeted, uint16_t version) {
+  if (greeted ? reply.type != MessageType::Pong || !reply.body.empty()
+              : reply.type != MessageType::Welcome || reply.body.size() < 14 ||
+                    (reply.body[4] << 8 | reply.body[5]) != version) {
+    fail("the connection answered with " + typeText(static_cast<uint8_t>(reply.type)));
+  }
+}
+
 // One frame of the stream; false when the server would close the connection after it.
 bool onFrame(ConnectionRules& rules, ZinSim::Target& target, const ServerOptions& options,
              Frame frame) {
+  const bool greeted = rules.greeted();
   FrameOutcome outcome = rules.onFrame(frame);
   switch (outcome.action) {
     case FrameOutcome::Action::Request:
       checkReply(frame, carryOut(frame, target, options.maxReadBytes));
       return true;
     case FrameOutcome::Action::Reply:
-      if (readReply(outcome.bytes).type != MessageType::Welcome) fail("a reply other than welcome");
+      checkAnswer(readReply(outcome.bytes), greeted, rules.version());
       return true;
     case FrameOutcome::Action::Refuse:
       checkText(readReply(textFrame(MessageType::Refused, outcome.why)));

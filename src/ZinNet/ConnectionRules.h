@@ -1,6 +1,7 @@
 // What a server connection does with each frame a client sends, apart from its socket: the length
-// limit, the greeting, and which frames are requests. ServerConnection reads the frames and acts
-// on the outcome; the frame fuzzer drives the same rules with a byte stream and no socket.
+// limit, the greeting and its version, the ping, and which frames are requests. ServerConnection
+// reads the frames and acts on the outcome; the frame fuzzer drives the same rules with a byte
+// stream and no socket.
 #ifndef ZINNET_SRC_CONNECTIONRULES_H
 #define ZINNET_SRC_CONNECTIONRULES_H
 
@@ -36,9 +37,12 @@ class ConnectionRules {
   /// connection closes. Until the greeting is done only its small frames fit, so a stranger
   /// cannot make the server set aside a large frame buffer before it has greeted.
   std::string lengthProblem(uint32_t length) const;
-  /// The outcome of a complete frame: a valid first hello greets the connection.
+  /// The outcome of a complete frame: a valid first hello greets the connection, a ping of
+  /// version 2 is answered here without the target.
   FrameOutcome onFrame(const Frame& frame);
-  bool greeted() const { return greeted_; }
+  bool greeted() const { return version_ != 0; }
+  /// The version agreed in the greeting (0 before).
+  uint16_t version() const { return version_; }
 
   /// The largest frame taken before the greeting is done (a hello is 7 bytes).
   static constexpr uint32_t kMaxGreetingFrameBytes = 64;
@@ -47,7 +51,7 @@ class ConnectionRules {
   FrameOutcome onHello(const Frame& frame);
 
   const ServerOptions& options_;
-  bool greeted_ = false;
+  uint16_t version_ = 0;
 };
 
 }  // namespace ZinNet
