@@ -110,20 +110,17 @@ TEST_F(WriteValues, SynchronousOutputsHoldPlainValuesAndFollowPulseTrains) {
 
   // 12 bits take four digits per step; of the 32 blocks of the text the 16 at the right end
   // (step 0 rightmost) are used. Spare bits of each block are set and ignored.
-  std::vector<uint32_t> stepValues;
+  const auto stepValue = [](uint32_t t) { return (t * 0x123u + 0x5Au) & 0xFFFu; };
   std::string text;
-  for (int t = 31; t >= 0; --t) {
+  for (uint32_t t = 32; t-- > 0;) {
     char block[8];
-    std::snprintf(
-        block, sizeof block, "%04X",
-        t >= 16 ? 0xABCDu : (static_cast<unsigned>(t) << 12) | ((t * 0x123u + 0x5Au) & 0xFFFu));
+    std::snprintf(block, sizeof block, "%04X", t >= 16 ? 0xABCDu : (t << 12) | stepValue(t));
     text += block;
   }
-  for (uint32_t t = 0; t < 16; ++t) stepValues.push_back((t * 0x123u + 0x5Au) & 0xFFFu);
   image = writeOk({{"p12.pulsetrain", text}, {"w16", "1234"}});
   for (uint32_t i = 0; i < 12; ++i) {
     std::string expected;
-    for (uint32_t t = 0; t < 16; ++t) expected.push_back(((stepValues[t] >> i) & 1) ? '1' : '0');
+    for (uint32_t t = 0; t < 16; ++t) expected.push_back(((stepValue(t) >> i) & 1) ? '1' : '0');
     EXPECT_EQ(image.steps[p12[i]], expected) << "value bit " << i << " on port bit " << p12[i];
   }
   EXPECT_EQ(image.syncUpdate, marks(kSyncOut, p12));
@@ -141,13 +138,10 @@ TEST_F(WriteValues, SynchronousOutputsHoldPlainValuesAndFollowPulseTrains) {
 
 TEST_F(WriteValues, OnlyTheExactPulsetrainSuffixAsksForAPulseTrain) {
   const std::string plainOne(16, '1'), trainOne = "1000000000000000";
-  const std::vector<std::pair<const char*, std::string>> cases = {{"s1", plainOne},
-                                                                  {"s1.anything", plainOne},
-                                                                  {"s1.PULSETRAIN", plainOne},
-                                                                  {"s1.b.pulsetrain", plainOne},
-                                                                  {"s1.pulsetrain", trainOne},
-                                                                  {"S1.pulsetrain", trainOne}};
-  for (const auto& [key, steps] : cases) EXPECT_EQ(writeOk({{key, "1"}}).steps[0], steps) << key;
+  for (const char* key : {"s1", "s1.anything", "s1.PULSETRAIN", "s1.b.pulsetrain"})
+    EXPECT_EQ(writeOk({{key, "1"}}).steps[0], plainOne) << key;
+  for (const char* key : {"s1.pulsetrain", "S1.pulsetrain"})
+    EXPECT_EQ(writeOk({{key, "1"}}).steps[0], trainOne) << key;
   EXPECT_EQ(writeOk({{"s1.value", "0"}}).steps[0], std::string(16, '0'));
   EXPECT_EQ(valueAt(writeOk({{"w8.PULSETRAIN", "5A"}}), w8), 0x5Au) << "a plain value";
 
@@ -179,15 +173,12 @@ TEST_F(WriteValues, AnEmptyMapSendsTheImageWithNothingMarked) {
   EXPECT_EQ(image.syncUpdate, std::string(kSyncOut, '0'));
   EXPECT_EQ(transport->flushCount(), 2u);
 
-  EXPECT_EQ(errorOf(ZinMOX_writeValues(handle, &ref, nullptr)),
-            "ZinMOX_writeValues() arg. failed:outputHashMap!=0");
-  EXPECT_EQ(errorOf(ZinMOX_readValues(handle, &ref, nullptr)),
-            "ZinMOX_readValues() arg. failed:inputHashMap!=0");
+  const std::string w = "ZinMOX_writeValues() arg. failed:", r = "ZinMOX_readValues() arg. failed:";
   uintptr_t nullWord = 0;
-  EXPECT_EQ(errorOf(ZinMOX_writeValues(handle, &ref, &nullWord)),
-            "ZinMOX_writeValues() arg. failed:*outputHashMap!=0");
-  EXPECT_EQ(errorOf(ZinMOX_readValues(handle, &ref, &nullWord)),
-            "ZinMOX_readValues() arg. failed:*inputHashMap!=0");
+  EXPECT_EQ(errorOf(ZinMOX_writeValues(handle, &ref, nullptr)), w + "outputHashMap!=0");
+  EXPECT_EQ(errorOf(ZinMOX_readValues(handle, &ref, nullptr)), r + "inputHashMap!=0");
+  EXPECT_EQ(errorOf(ZinMOX_writeValues(handle, &ref, &nullWord)), w + "*outputHashMap!=0");
+  EXPECT_EQ(errorOf(ZinMOX_readValues(handle, &ref, &nullWord)), r + "*inputHashMap!=0");
   EXPECT_EQ(transport->transfers().size(), 2u);
 }
 
