@@ -51,12 +51,9 @@ struct Recorder {
 class Scenario {
  public:
   Scenario() : transport_(std::make_shared<ZinTestKit::ScriptedTransport>()) {
-    ZinTestKit::MoxStatus status;
-    status.asyncInputCount = 12;
-    status.syncInputCount = 9;
-    status.asyncOutputCount = 10;
-    status.syncOutputCount = 7;
-    transport_->placeMoxCore(ref_, status);
+    transport_->placeMoxCore(
+        ref_,
+        {.asyncInputCount = 12, .syncInputCount = 9, .asyncOutputCount = 10, .syncOutputCount = 7});
     transport_->queueReadData(std::vector<unsigned char>(32, 0x5A));
     handle_ = ZinJtag_openSession(transport_);
     ZinJtag_setMessageHandler(handle_, &Recorder::onMessage, &recorder);
@@ -157,10 +154,10 @@ bool runWithFailureAt(uint64_t n) {
   ZinStress::armAllocationFailure(n);
   for (size_t i = 0; i < calls.size(); ++i) {
     results[i] = calls[i].second();
-    if (failedAt == calls.size() && ZinStress::allocationFailureHappened()) failedAt = i;
+    if (failedAt == calls.size() && ZinStress::failed) failedAt = i;
     messagesOf[i] = scenario.recorder.take();
   }
-  ZinStress::disarmAllocationFailure();
+  ZinStress::armed = false;
 
   for (size_t i = 0; i < calls.size(); ++i) {
     const std::vector<Message>& messages = messagesOf[i];
@@ -192,10 +189,10 @@ bool runWithFailureAt(uint64_t n) {
 
 TEST(AllocationFailure, EveryAllocationOfACallSequenceMayFail) {
   runWithFailureAt(0);  // warm-up: the framework's registries make their one-time allocations
-  const int64_t liveBefore = ZinStress::liveAllocations();
+  const int64_t liveBefore = ZinStress::live.load();
   uint64_t n = 1;
   for (; n < 100000 && !::testing::Test::HasFailure() && runWithFailureAt(n); ++n) {
-    ASSERT_EQ(ZinStress::liveAllocations(), liveBefore) << "allocations leaked with N=" << n;
+    ASSERT_EQ(ZinStress::live.load(), liveBefore) << "allocations leaked with N=" << n;
   }
   EXPECT_GT(n, 50u) << "the sequence makes allocations to fail";
   RecordProperty("sequence_allocations", static_cast<int>(n - 1));
