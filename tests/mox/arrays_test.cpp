@@ -169,13 +169,9 @@ TEST_F(Arrays, ThreeSamplesLandOneBlockApart) {
         EXPECT_EQ(buffer[k * width + b] & mask, expected[b]) << "byte " << b;
       }
     };
-    expectBlock(x[0], 2, blockOf(images[k].asyncValue, x12), 0x0F);
-    expectBlock(x[1], 2, blockOf(images[k].asyncUp, x12), 0x0F);
-    expectBlock(x[2], 2, blockOf(images[k].asyncDown, x12), 0x0F);
-    expectBlock(y[0], 1, blockOf(images[k].syncValue, y3), 0x07);
-    expectBlock(y[1], 1, blockOf(images[k].syncUp, y3), 0x07);
-    expectBlock(y[2], 1, blockOf(images[k].syncDown, y3), 0x07);
-    expectBlock(y[4], 1, blockOf(images[k].syncSyncDown, y3), 0x07);
+    const auto vectors = images[k].vectors();  // x[v] holds async vector v, y[v] sync vector v
+    for (int v : {0, 1, 2}) expectBlock(x[v], 2, blockOf(*vectors[v], x12), 0x0F);
+    for (int v : {0, 1, 2, 4}) expectBlock(y[v], 1, blockOf(*vectors[3 + v], y3), 0x07);
   }
   EXPECT_EQ(x[0][1] & 0xF0, 0xF0);
   EXPECT_EQ(y[3], std::vector<uint8_t>(3, 0));
