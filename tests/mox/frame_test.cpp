@@ -171,11 +171,10 @@ TEST_F(CallFrame, WrongCoreTypeIsReportedUnderTheLockThenAborted) {
     EXPECT_EQ(ZinMOX_getInfo(handle, coreRef, &info), kFailure);
     EXPECT_EQ(std::bit_cast<InfoFields>(info), InfoFields{}) << "the record stays all zero";
     expectWrongCoreType(kGetInfoWrongType);
-    ZinMOX_ValueMap keys{{"other", "x"}};
-    uintptr_t keysWord = mapWord(keys);
-    EXPECT_EQ(ZinMOX_getCoreInfo(handle, coreRef, &keysWord), kFailure);
+    infoMap = {{"other", "x"}};
+    EXPECT_EQ(ZinMOX_getCoreInfo(handle, coreRef, &infoWord), kFailure);
     expectWrongCoreType(kGetInfoWrongType);
-    EXPECT_EQ(keys, (ZinMOX_ValueMap{{"other", "x"}}));
+    EXPECT_EQ(infoMap, (ZinMOX_ValueMap{{"other", "x"}}));
     uint32_t result = 77;
     EXPECT_EQ(ZinMOX_isMOXCore(handle, coreRef, &result), 0u) << "not a MOX core is no failure";
     EXPECT_EQ(result, 0u);

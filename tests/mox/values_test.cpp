@@ -206,19 +206,17 @@ TEST_F(ReadValues, ReportsEveryInputUnderItsKeysAndKeepsOtherKeys) {
   expectNoMessages();
   ZinMOX_ValueMap expected{{"unrelated", "keep"}, {"async_out_data", "7"}};
   // The hexadecimal text of the port characters at the positions (value bit i at port bit
-  // positions[i]) under each key of a signal.
+  // positions[i]) under each key of a signal, the keys in the order of the image's vectors.
   const auto add = [&](const std::string& name, bool sync, const std::vector<uint32_t>& at) {
-    const auto hexOf = [&](const std::string& port) {
+    const char* suffixes[] = {".value", ".activity_up", ".activity_down", ".sync_activity_up",
+                              ".sync_activity_down"};
+    for (int k = 0; k < (sync ? 5 : 3); ++k) {
+      const std::string& port = *image.vectors()[sync * 3 + k];
       std::string bits;
       for (std::size_t i = at.size(); i-- > 0;) bits.push_back(port[at[i]]);
-      return bitsToHex(bits);
-    };
-    expected[name] = expected[name + ".value"] = hexOf(sync ? image.syncValue : image.asyncValue);
-    expected[name + ".activity_up"] = hexOf(sync ? image.syncUp : image.asyncUp);
-    expected[name + ".activity_down"] = hexOf(sync ? image.syncDown : image.asyncDown);
-    if (!sync) return;
-    expected[name + ".sync_activity_up"] = hexOf(image.syncSyncUp);
-    expected[name + ".sync_activity_down"] = hexOf(image.syncSyncDown);
+      expected[name + suffixes[k]] = bitsToHex(bits);
+    }
+    expected[name] = expected[name + ".value"];
   };
   add("a", false, a);
   add("s", true, s);
