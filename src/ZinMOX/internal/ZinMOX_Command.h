@@ -37,9 +37,12 @@ class ZinMOX_Command {
   /// given, receives the bits that the text reads back.
   std::string& buildCommandText(const ZIN_CORE_REF& coreRef, uint32_t code, std::string& text,
                                 uint32_t* readBitCount) const;
-  /// Copies value and activity characters of the input bits out of the read bit text.
-  void unpackAsyncInputs(const char* bits);
-  void unpackSyncInputs(const char* bits);
+  /// Sets the value and activity characters of the input bits from the packed read data (the
+  /// input bits of the read line, its last bit in bit 0). Reads whole words: the data must hold
+  /// READ_DATA_SLACK bytes past the line's.
+  void unpackAsyncInputs(const unsigned char* data);
+  void unpackSyncInputs(const unsigned char* data);
+  static constexpr uint32_t READ_DATA_SLACK = 8;
 
   void setAsyncOutValueBits(std::string bits) { asyncOutValueBits = std::move(bits); }
   void setAsyncOutUpdateBits(std::string bits) { asyncOutUpdateBits = std::move(bits); }
@@ -173,7 +176,6 @@ class ZinMOX_Command {
   RenderedLines readLines_;
   std::string writeText_;
   std::vector<unsigned char> readData_;
-  std::string readBitText_;
 };
 
 }  // namespace ZinRT
