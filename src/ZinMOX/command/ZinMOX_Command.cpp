@@ -116,7 +116,7 @@ void ZinMOX_Command::holdPulseTrainRun(uint32_t first, const uint8_t* value, uin
   for (uint32_t i = 0; i < n; ++i) {
     holdPulseTrain(first + i, ((value[i / 8] >> (i % 8)) & 1u) != 0 ? '1' : '0');
   }
-  std::memset(syncOutUpdateBits.data() + first, '1', n);
+  markSyncOutRun(first, n);
 }
 
 std::string& ZinMOX_Command::buildCommandText(const ZIN_CORE_REF& coreRef, uint32_t code,

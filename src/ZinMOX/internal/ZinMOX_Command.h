@@ -71,8 +71,13 @@ class ZinMOX_Command {
   void setStepVectors(const uint8_t* vectors, uint32_t count);
   /// Sets the step strings of `count` synchronous outputs from 16 packed step vectors given one
   /// by one (`vectors[t]` is step t, bit i of it for value bit i): character t of the string of
-  /// output positions[i] (of output i when `positions` is null) is bit i of vector t.
-  void stageStepVectors(const uint8_t* const* vectors, const uint32_t* positions, uint32_t count);
+  /// output positions[i] (of output first+i when `positions` is null) is bit i of vector t.
+  void stageStepVectors(const uint8_t* const* vectors, const uint32_t* positions, uint32_t first,
+                        uint32_t count);
+  /// Marks the synchronous outputs first to first+n-1 for update.
+  void markSyncOutRun(uint32_t first, uint32_t n) {
+    std::memset(syncOutUpdateBits.data() + first, '1', n);
+  }
   /// Stages value bits 0 to n-1 of a packed vector on the asynchronous outputs first to
   /// first+n-1, each with its update mark (a run of consecutive port bits).
   void stageAsyncRun(uint32_t first, const uint8_t* value, uint32_t n);

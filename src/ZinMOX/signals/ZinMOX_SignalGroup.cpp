@@ -120,7 +120,12 @@ void ZinMOX_SignalGroup::setValues(const uint8_t* value, uint32_t byteSize, uint
       vectors[step] = vector;
       if (step + 1 < stepCount) vector += bytes;
     }
-    command->stageStepVectors(vectors, positions.data(), n);
+    if (run) {
+      command->stageStepVectors(vectors, nullptr, positions[0], n);
+      command->markSyncOutRun(positions[0], n);
+      return;
+    }
+    command->stageStepVectors(vectors, positions.data(), 0, n);
     for (uint32_t i = 0; i < n; ++i) command->setSyncOutUpdateChar(positions[i], '1');
   } else {
     if (byteSize < bytes) failTooSmall(getName());
