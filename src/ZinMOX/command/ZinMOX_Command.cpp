@@ -112,13 +112,6 @@ void ZinMOX_Command::stageAsyncRun(uint32_t first, const uint8_t* value, uint32_
   std::memset(asyncOutUpdateBits.data() + first, '1', n);
 }
 
-void ZinMOX_Command::holdPulseTrainRun(uint32_t first, const uint8_t* value, uint32_t n) {
-  for (uint32_t i = 0; i < n; ++i) {
-    holdPulseTrain(first + i, ((value[i / 8] >> (i % 8)) & 1u) != 0 ? '1' : '0');
-  }
-  markSyncOutRun(first, n);
-}
-
 std::string& ZinMOX_Command::buildCommandText(const ZIN_CORE_REF& coreRef, uint32_t code,
                                               std::string& text, uint32_t* readBitCount) const {
   if (readBitCount != nullptr) *readBitCount = 0;

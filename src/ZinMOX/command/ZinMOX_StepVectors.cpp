@@ -91,18 +91,22 @@ void ZinMOX_Command::setStepVectors(const uint8_t* vectors, uint32_t count) {
 void ZinMOX_Command::stageStepVectors(const uint8_t* const* vectors, const uint32_t* positions,
                                       uint32_t first, uint32_t count) {
   const uint32_t stepBytes = mox::byteCount(count);
-  const auto trainOf = [&](uint32_t bit) {
-    return trainAt(positions != nullptr ? positions[bit] : first + bit);
-  };
   uint32_t byte = 0;
 #if defined(__SSE2__)
+  // Outputs base to base+outputs-1 from a column register; the trains of consecutive outputs
+  // follow each other.
+  const auto stage = [&](__m128i column, uint32_t base, uint32_t outputs) {
+    if (positions == nullptr) {
+      char* const trains = trainAt(first + base);
+      stageColumn(column, outputs, [&](uint32_t b) { return trains + STEP_COUNT * b; });
+    } else {
+      stageColumn(column, outputs, [&](uint32_t b) { return trainAt(positions[base + b]); });
+    }
+  };
   for (; count - 8 * byte >= 64; byte += 8) {
     __m128i columns[8];
     transposeEightColumns(vectors, byte, columns);
-    for (uint32_t j = 0; j < 8; ++j) {
-      const uint32_t base = 8 * (byte + j);
-      stageColumn(columns[j], 8, [&](uint32_t b) { return trainOf(base + b); });
-    }
+    for (uint32_t j = 0; j < 8; ++j) stage(columns[j], 8 * (byte + j), 8);
   }
 #else
   ColumnSteps column;
@@ -119,8 +123,7 @@ void ZinMOX_Command::stageStepVectors(const uint8_t* const* vectors, const uint3
     const uint32_t outputs = std::min<uint32_t>(8, count - 8 * byte);
     const uint32_t base = 8 * byte;
 #if defined(__SSE2__)
-    stageColumn(_mm_set_epi64x(static_cast<int64_t>(late), static_cast<int64_t>(early)), outputs,
-                [&](uint32_t b) { return trainOf(base + b); });
+    stage(_mm_set_epi64x(static_cast<int64_t>(late), static_cast<int64_t>(early)), base, outputs);
 #else
     transposeColumn(early, late, column);
     for (uint32_t b = 0; b < outputs; ++b)
@@ -128,6 +131,22 @@ void ZinMOX_Command::stageStepVectors(const uint8_t* const* vectors, const uint3
                          column.steps[b]);
 #endif
   }
+}
+
+void ZinMOX_Command::holdPulseTrainRun(uint32_t first, const uint8_t* value, uint32_t n) {
+#if defined(__SSE2__)
+  // Holding a level on all steps is a column whose sixteen step bytes are the value's byte.
+  for (uint32_t byte = 0; 8 * byte < n; ++byte) {
+    char* const trains = trainAt(first + 8 * byte);  // the eight outputs' trains follow each other
+    stageColumn(_mm_set1_epi8(static_cast<char>(value[byte])), std::min<uint32_t>(8, n - 8 * byte),
+                [&](uint32_t b) { return trains + STEP_COUNT * b; });
+  }
+#else
+  for (uint32_t i = 0; i < n; ++i) {
+    holdPulseTrain(first + i, ((value[i / 8] >> (i % 8)) & 1u) != 0 ? '1' : '0');
+  }
+#endif
+  markSyncOutRun(first, n);
 }
 
 }  // namespace ZinRT

@@ -49,6 +49,7 @@ bool isContiguous(const uint32_t* positions, uint32_t n) {
   const uint32_t first = positions[0];
   if (positions[n - 1] - first != n - 1) return false;  // most groups that are not a run
   uint32_t differences = 0;  // no early exit: the loop is a few vector instructions per 4 bits
+#pragma GCC unroll 4
   for (uint32_t i = 1; i < n; ++i) differences |= positions[i] ^ (first + i);
   return differences == 0;
 }
