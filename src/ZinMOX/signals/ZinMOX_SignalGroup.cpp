@@ -30,6 +30,10 @@ void collectBits(const std::string& image, const uint32_t* positions, uint32_t n
       packed[i / 8] |= static_cast<uint8_t>(ones);
       packed[i / 8 + 1] |= static_cast<uint8_t>(ones >> 8);
     }
+    if (i + 8 <= n) {
+      packed[i / 8] |= static_cast<uint8_t>(mox::onesWordLsbFirst(mox::loadWord(run + i)));
+      i += 8;
+    }
   }
   for (; i + 8 <= n; i += 8) {
     unsigned byte = 0;
