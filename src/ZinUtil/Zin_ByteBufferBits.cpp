@@ -1,6 +1,5 @@
 // Bit fields and hexadecimal texts of a byte buffer.
 #include <algorithm>
-#include <bit>
 #include <cstring>
 #include <memory>
 #include <stdexcept>
@@ -95,9 +94,8 @@ Zin_ByteBuffer* Zin_ByteBuffer::hex2Bin(uint32_t first, uint32_t last) const {
   uint32_t k = 0;
   for (uint64_t pairs = 0; digitCount - k >= 16 && detail::hexPairs16(text + last - k - 15, pairs);
        k += 16) {
-    // Pair m goes to byte k/2 + 7 - m: the eight bytes in reverse order, stored at once.
-    if constexpr (std::endian::native == std::endian::little) pairs = __builtin_bswap64(pairs);
-    std::memcpy(bytes + k / 2, &pairs, sizeof pairs);
+    unsigned char* out = bytes + k / 2;  // pair m goes to byte k/2 + 7 - m
+    for (unsigned m = 0; m < 8; ++m) out[7 - m] = static_cast<unsigned char>(pairs >> (8 * m));
   }
   for (; k < digitCount; ++k) {
     int v = detail::kHexValues[static_cast<unsigned char>(text[last - k])];
