@@ -107,6 +107,10 @@ TEST_F(WriteValues, SynchronousOutputsHoldPlainValuesAndFollowPulseTrains) {
   EXPECT_EQ(image.steps[3], std::string(16, '1'));
   EXPECT_EQ(image.syncUpdate, marks(kSyncOut, p3));
   EXPECT_EQ(image.asyncUpdate, std::string(kAsyncOut, '0'));
+  image = writeOk({{"sync_out_data", "A5C3"}});  // a run of two bytes
+  for (uint32_t i = 0; i < kSyncOut; ++i) {
+    EXPECT_EQ(image.steps[i], std::string(16, ((0xA5C3u >> i) & 1u) != 0 ? '1' : '0')) << i;
+  }
 
   // 12 bits take four digits per step; of the 32 blocks of the text the 16 at the right end
   // (step 0 rightmost) are used. Spare bits of each block are set and ignored.
