@@ -16,6 +16,9 @@ inline constexpr uint32_t kLengthBytes = 4;
 inline constexpr uint32_t kMaxStatusBytes = 256;
 /// Error texts longer than this are cut.
 inline constexpr uint32_t kMaxErrorText = 4096;
+/// Bytes of each nonce and of each HMAC-SHA256 of the token exchange.
+inline constexpr uint32_t kNonceBytes = 32;
+inline constexpr uint32_t kMacBytes = 32;
 
 /// The first byte of every frame.
 enum class MessageType : uint8_t {
@@ -25,15 +28,19 @@ enum class MessageType : uint8_t {
   CommandSequence = 0x03,  // u32 read bit count, then the command text
   Flush = 0x04,            // empty
   ListCores = 0x05,        // empty
+  TokenRequest = 0x10,     // 32-byte client nonce: asks for a token challenge
+  TokenProof = 0x11,       // 32-byte HMAC-SHA256 proving the client knows the token
   // Server to client.
-  Welcome = 0x81,       // magic, u16 version, u32 max frame bytes, u32 max read bytes, name text
-  Status = 0x82,        // 5 x u32 core information, then the status bytes
-  ReadData = 0x83,      // the read data bytes
-  Flushed = 0x84,       // empty
-  Cores = 0x85,         // u8 supported, u32 count, count x (u32 device, chain, core)
-  TargetFailed = 0xE0,  // text: the target refused or failed the request; connection stays
-  Refused = 0xE1,       // text: the request was malformed; connection stays
-  Closing = 0xE2        // text: the server closes the connection after this frame
+  Welcome = 0x81,         // magic, u16 version, u32 max frame bytes, u32 max read bytes, name text
+  Status = 0x82,          // 5 x u32 core information, then the status bytes
+  ReadData = 0x83,        // the read data bytes
+  Flushed = 0x84,         // empty
+  Cores = 0x85,           // u8 supported, u32 count, count x (u32 device, chain, core)
+  TokenChallenge = 0x90,  // 32-byte server nonce, 32-byte HMAC-SHA256 proving the server's token
+  TokenAccepted = 0x91,   // empty: requests may follow
+  TargetFailed = 0xE0,    // text: the target refused or failed the request; connection stays
+  Refused = 0xE1,         // text: the request was malformed; connection stays
+  Closing = 0xE2          // text: the server closes the connection after this frame
 };
 
 }  // namespace ZinNet::Protocol

@@ -114,6 +114,18 @@ std::string typeText(uint8_t type) {
     case MessageType::ListCores:
       name = "core list";
       break;
+    case MessageType::TokenRequest:
+      name = "token request";
+      break;
+    case MessageType::TokenProof:
+      name = "token proof";
+      break;
+    case MessageType::TokenChallenge:
+      name = "token challenge";
+      break;
+    case MessageType::TokenAccepted:
+      name = "token accepted";
+      break;
     case MessageType::Welcome:
       name = "welcome";
       break;

@@ -13,15 +13,15 @@ using Protocol::MessageType;
 ServerConnection::ServerConnection(std::shared_ptr<ServerState> state, asio::ip::tcp::socket socket,
                                    asio::any_io_executor requests, uint64_t id)
     : state_(std::move(state)),
-      socket_(std::move(socket)),
-      timer_(socket_.get_executor()),
+      stream_(std::move(socket)),
+      timer_(stream_.get_executor()),
       requests_(std::move(requests)),
       id_(id) {
   std::error_code ec;
-  const auto remote = socket_.remote_endpoint(ec);
+  const auto remote = stream_.socket().remote_endpoint(ec);
   peer_ = ec ? std::string("an unknown peer")
              : remote.address().to_string() + ":" + std::to_string(remote.port());
-  socket_.set_option(asio::ip::tcp::no_delay(true), ec);
+  stream_.socket().set_option(asio::ip::tcp::no_delay(true), ec);
   ++state_->connectionsOpen;
 }
 
@@ -31,8 +31,39 @@ ServerConnection::~ServerConnection() {
 
 void ServerConnection::start() {
   state_->log("connection " + std::to_string(id_) + " from " + peer_ + " opened");
-  armTimer(state_->options.greetingTimeoutMs, "the greeting");
+  greetingDeadline_ = std::chrono::steady_clock::now() +
+                      std::chrono::milliseconds(state_->options.greetingTimeoutMs);
+  armGreetingTimer();
+  if (!state_->tls) {
+    readPrefix();
+    return;
+  }
+  stream_.startTls(*state_->tls)
+      .async_handshake(
+          asio::ssl::stream_base::server,
+          [self = shared_from_this()](std::error_code ec) { self->afterHandshake(ec); });
+}
+
+void ServerConnection::afterHandshake(std::error_code ec) {
+  if (closed_) return;
+  if (ec) {
+    ++state_->framesRefused;
+    close("TLS handshake failed: " + ec.message());
+    return;
+  }
   readPrefix();
+}
+
+// The handshake, the hello and the token proof share one deadline from the connection's start.
+void ServerConnection::armGreetingTimer() {
+  if (state_->options.greetingTimeoutMs == 0) {
+    disarmTimer();
+    return;
+  }
+  const auto left = std::chrono::duration_cast<std::chrono::milliseconds>(
+      greetingDeadline_ - std::chrono::steady_clock::now());
+  armTimer(static_cast<uint32_t>(std::max<int64_t>(1, left.count())), "the greeting",
+           state_->options.greetingTimeoutMs);
 }
 
 bool ServerConnection::evictable(std::chrono::steady_clock::time_point& since) const {
@@ -45,8 +76,8 @@ void ServerConnection::close(const std::string& why) {
   closed_ = true;
   std::error_code ec;
   timer_.cancel();
-  socket_.shutdown(asio::ip::tcp::socket::shutdown_both, ec);
-  socket_.close(ec);
+  stream_.socket().shutdown(asio::ip::tcp::socket::shutdown_both, ec);
+  stream_.socket().close(ec);
   state_->log("connection " + std::to_string(id_) + " closed after " +
               std::to_string(requestCount_) + " requests: " + why);
 }
@@ -64,15 +95,16 @@ void ServerConnection::refuse(const std::string& why, bool thenClose) {
   send(textFrame(thenClose ? MessageType::Closing : MessageType::Refused, why), thenClose);
 }
 
-void ServerConnection::armTimer(uint32_t ms, const char* what) {
+void ServerConnection::armTimer(uint32_t ms, const char* what, uint32_t limitMs) {
   const uint64_t generation = ++timerGeneration_;
   timer_.cancel();
   if (ms == 0) return;
+  if (limitMs == 0) limitMs = ms;
   timer_.expires_after(std::chrono::milliseconds(ms));
-  timer_.async_wait([self = shared_from_this(), generation, ms, what](std::error_code ec) {
+  timer_.async_wait([self = shared_from_this(), generation, limitMs, what](std::error_code ec) {
     if (ec || generation != self->timerGeneration_ || self->closed_) return;
     ++self->state_->framesRefused;
-    self->close(std::string(what) + " not done within " + std::to_string(ms) + " ms");
+    self->close(std::string(what) + " not done within " + std::to_string(limitMs) + " ms");
   });
 }
 
@@ -98,11 +130,15 @@ void ServerConnection::onReadError(std::error_code ec, const char* where) {
 
 void ServerConnection::readPrefix() {
   if (closed_) return;
-  // Before the hello, the greeting timer armed at the start runs on.
-  if (prefixBytes_ == 0 && greeted_) {
-    armTimer(state_->options.idleTimeoutMs, "waiting for a frame");
+  // Until the client is admitted, the greeting's deadline holds for every frame.
+  if (prefixBytes_ == 0) {
+    if (admitted_) {
+      armTimer(state_->options.idleTimeoutMs, "waiting for a frame");
+    } else {
+      armGreetingTimer();
+    }
   }
-  socket_.async_read_some(
+  stream_.async_read_some(
       asio::buffer(prefix_.data() + prefixBytes_, prefix_.size() - prefixBytes_),
       [self = shared_from_this()](std::error_code ec, size_t n) { self->onPrefix(ec, n); });
 }
@@ -112,7 +148,7 @@ void ServerConnection::onPrefix(std::error_code ec, size_t n) {
     onReadError(ec, prefixBytes_ == 0 ? "between frames" : "inside a frame's length");
     return;
   }
-  if (prefixBytes_ == 0 && n != 0 && greeted_) {
+  if (prefixBytes_ == 0 && n != 0 && admitted_) {
     armTimer(state_->options.frameTimeoutMs, "a frame");
   }
   prefixBytes_ += n;
@@ -135,7 +171,7 @@ void ServerConnection::onPrefix(std::error_code ec, size_t n) {
 
 void ServerConnection::readBody(uint32_t length) {
   body_.assign(length, 0);
-  asio::async_read(socket_, asio::buffer(body_),
+  asio::async_read(stream_, asio::buffer(body_),
                    [self = shared_from_this()](std::error_code ec, size_t) {
                      if (ec) {
                        self->onReadError(ec, "inside a frame");
@@ -157,8 +193,14 @@ void ServerConnection::onFrame(Frame frame) {
   inExchange_ = true;
   if (!greeted_) {
     onHello(frame);
+  } else if (!admitted_) {
+    onTokenStep(frame);
   } else if (frame.type == MessageType::Hello) {
     refuse("hello sent twice", false);
+  } else if (frame.type == MessageType::TokenRequest) {
+    refuse(state_->options.token.empty() ? "this server asks for no token"
+                                         : "the token was already proven",
+           false);
   } else if (!isRequest(frame.type)) {
     refuse("unknown request type " + typeText(static_cast<uint8_t>(frame.type)), false);
   } else {
@@ -184,6 +226,7 @@ void ServerConnection::onHello(const Frame& frame) {
     return;
   }
   greeted_ = true;
+  admitted_ = state_->options.token.empty();
   FrameWriter out(MessageType::Welcome);
   out.bytes(Protocol::kMagic, 4).u16(Protocol::kVersion);
   out.u32(state_->options.maxFrameBytes).u32(state_->options.maxReadBytes);
@@ -202,7 +245,7 @@ void ServerConnection::runRequest(Frame frame) {
       std::lock_guard<std::mutex> lock(self->state_->requestMutex);
       reply = carryOut(frame, *self->state_->transport, self->state_->options.maxReadBytes);
     }
-    asio::post(self->socket_.get_executor(), [self, type, reply = std::move(reply)]() mutable {
+    asio::post(self->stream_.get_executor(), [self, type, reply = std::move(reply)]() mutable {
       if (reply.carriedOut) {
         ++self->state_->requestsServed;
         ++self->requestCount_;
@@ -224,7 +267,7 @@ void ServerConnection::lingerAndClose() {
   // Stop sending, then drop what the client still sends until it closes too (bounded by a
   // timer), so that the closing frame is not lost to a reset caused by unread bytes.
   std::error_code ec;
-  socket_.shutdown(asio::ip::tcp::socket::shutdown_send, ec);
+  stream_.socket().shutdown(asio::ip::tcp::socket::shutdown_send, ec);
   const uint64_t generation = ++timerGeneration_;
   timer_.expires_after(std::chrono::milliseconds(kLingerMs));
   timer_.async_wait([self = shared_from_this(), generation](std::error_code e) {
@@ -234,7 +277,7 @@ void ServerConnection::lingerAndClose() {
 }
 
 void ServerConnection::drain() {
-  socket_.async_read_some(asio::buffer(scratch_),
+  stream_.async_read_some(asio::buffer(scratch_),
                           [self = shared_from_this()](std::error_code ec, size_t) {
                             if (self->closed_) return;
                             if (ec) {
@@ -249,7 +292,7 @@ void ServerConnection::send(std::vector<unsigned char> bytes, bool thenClose) {
   if (closed_) return;
   outgoing_ = std::move(bytes);
   armTimer(state_->options.writeTimeoutMs, "sending a reply");
-  asio::async_write(socket_, asio::buffer(outgoing_),
+  asio::async_write(stream_, asio::buffer(outgoing_),
                     [self = shared_from_this(), thenClose](std::error_code ec, size_t) {
                       if (self->closed_) return;
                       self->disarmTimer();

@@ -11,7 +11,9 @@
 
 #include "Asio.h"
 #include "Frame.h"
+#include "NetStream.h"
 #include "ServerState.h"
+#include "TokenProof.h"
 
 namespace ZinNet {
 
@@ -42,17 +44,24 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   void readBody(uint32_t length);
   void onFrame(Frame frame);
   void onHello(const Frame& frame);
+  void onTokenStep(const Frame& frame);
+  void onTokenRequest(const Frame& frame);
+  void onTokenProof(const Frame& frame);
+  void refuseToken(const std::string& why);
+  void afterHandshake(std::error_code ec);
+  void armGreetingTimer();
   void runRequest(Frame frame);
   void send(std::vector<unsigned char> bytes, bool thenClose);
   void lingerAndClose();
   void drain();
   void refuse(const std::string& why, bool thenClose);
-  void armTimer(uint32_t ms, const char* what);
+  /// Closes the connection unless disarmed within `ms`; the message names `limitMs` (else `ms`).
+  void armTimer(uint32_t ms, const char* what, uint32_t limitMs = 0);
   void disarmTimer();
   void onReadError(std::error_code ec, const char* where);
 
   std::shared_ptr<ServerState> state_;
-  asio::ip::tcp::socket socket_;
+  NetStream stream_;
   asio::steady_timer timer_;
   asio::any_io_executor requests_;
   uint64_t id_;
@@ -65,6 +74,11 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   std::array<unsigned char, 4096> scratch_{};
   static constexpr uint32_t kLingerMs = 1000;
   bool greeted_ = false;
+  bool admitted_ = false;    // greeted, and the token proven when the server has one
+  bool challenged_ = false;  // a token challenge was sent
+  Nonce clientNonce_{};
+  Nonce serverNonce_{};
+  std::chrono::steady_clock::time_point greetingDeadline_{};
   bool closed_ = false;
   bool leaving_ = false;     // a closing frame is being sent
   bool inExchange_ = false;  // a request is queued, carried out or answered
