@@ -7,7 +7,7 @@
 #include "Convert.h"
 #include "ZinHost/BitList.h"
 #include "ZinHost/Signals.h"
-#include "ZinMOX/ZinMOX_CoreInfoFields.h"
+#include "internal/ZinMOX_CoreInfoFields.h"
 
 namespace py = pybind11;
 

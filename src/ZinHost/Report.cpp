@@ -5,7 +5,7 @@
 
 #include "ZinHost/CoreRef.h"
 #include "ZinHost/Table.h"
-#include "ZinMOX/ZinMOX_CoreInfoFields.h"
+#include "internal/ZinMOX_CoreInfoFields.h"
 
 namespace ZinHost {
 

@@ -4,16 +4,13 @@
 #include <stdexcept>
 #include <string>
 
+#include "ZinRT/Zin_NumberUtil.h"
+
 namespace ZinHub {
 
 namespace {
 
-int hexDigit(char c) {
-  if (c >= '0' && c <= '9') return c - '0';
-  if (c >= 'a' && c <= 'f') return c - 'a' + 10;
-  if (c >= 'A' && c <= 'F') return c - 'A' + 10;
-  return -1;
-}
+int hexDigit(char c) { return ZinRT::Zin_NumberUtil::hexDigitValue(c); }
 
 uint32_t fixedField(std::string_view field, size_t digits, const char* name) {
   uint32_t value = 0;

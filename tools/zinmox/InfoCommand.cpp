@@ -6,7 +6,7 @@
 #include "ZinHost/CoreRef.h"
 #include "ZinHost/Report.h"
 #include "ZinMOX/ZinMOX.h"
-#include "ZinMOX/ZinMOX_CoreInfoFields.h"
+#include "internal/ZinMOX_CoreInfoFields.h"
 
 namespace zinmox {
 

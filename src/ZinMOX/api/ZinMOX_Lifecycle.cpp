@@ -3,7 +3,7 @@
 #include <string>
 
 #include "ZinMOX/ZinMOX.h"
-#include "ZinMOX/ZinMOX_CoreInfoFields.h"
+#include "internal/ZinMOX_CoreInfoFields.h"
 #include "api/ZinMOX_CallFrame.h"
 
 using namespace ZinRT;

@@ -16,7 +16,7 @@
 #include "ZinHost/TextError.h"
 #include "ZinHost/ValueText.h"
 #include "ZinMOX/ZinMOX.h"
-#include "ZinMOX/ZinMOX_CoreInfoFields.h"
+#include "internal/ZinMOX_CoreInfoFields.h"
 #include "ZinRT/Zin_CoreComm.h"
 
 namespace zinmox::dashboard {

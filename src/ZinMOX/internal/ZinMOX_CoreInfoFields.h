@@ -1,4 +1,6 @@
-// The keys under which ZinMOX_getCoreInfo reports the fields of a MOX core's information record.
+// The keys under which ZinMOX_getCoreInfo reports the fields of a MOX core's information record,
+// in the record's order. Internal: the library and the project's clients share it; hosts read the
+// keys from the map (ZinMOX.h lists them).
 #ifndef ZINMOX_COREINFOFIELDS_H
 #define ZINMOX_COREINFOFIELDS_H
 
