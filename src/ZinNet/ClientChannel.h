@@ -68,8 +68,8 @@ class ClientChannel {
   ClientOptions options_;
   asio::io_context io_;
   asio::ip::tcp::resolver resolver_;
-  NetStream stream_;
   std::unique_ptr<asio::ssl::context> tls_;  // made on the first TLS connection
+  NetStream stream_;                         // after the context: its TLS layer uses it
   bool connected_ = false;
   std::string serverName_;
   uint32_t serverMaxFrame_ = 0;

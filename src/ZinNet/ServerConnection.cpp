@@ -85,6 +85,10 @@ void ServerConnection::close(const std::string& why) {
 void ServerConnection::refuseAndClose(const std::string& why) {
   leaving_ = true;
   state_->log("connection from " + peer_ + " refused: " + why);
+  if (state_->tls) {
+    close(why);  // a TLS client could not read a frame sent before the handshake
+    return;
+  }
   send(textFrame(MessageType::Closing, why), true);
 }
 

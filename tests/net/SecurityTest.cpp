@@ -29,8 +29,8 @@ Bytes clientProof(const Bytes& serverNonce, const Bytes& clientNonce) {
   const Bytes message = concat({text("ZNET client"), serverNonce, clientNonce});
   Bytes mac(32);
   unsigned int length = 0;
-  HMAC(EVP_sha256(), kToken.data(), static_cast<int>(kToken.size()), message.data(),
-       message.size(), mac.data(), &length);
+  HMAC(EVP_sha256(), kToken.data(), static_cast<int>(kToken.size()), message.data(), message.size(),
+       mac.data(), &length);
   return mac;
 }
 
@@ -119,8 +119,7 @@ TEST(Security, OnlyLoopbackGoesWithoutATokenUnlessInsecure) {
   ZinNet::Server open(std::make_shared<ZinSim::Target>(), options);
   open.start();
   open.stop();
-  EXPECT_NE(log.front().find("WARNING: open to other machines without a token"),
-            std::string::npos);
+  EXPECT_NE(log.front().find("WARNING: open to other machines without a token"), std::string::npos);
   // A client with a token insists that the server proves it too.
   TestServer plain(std::make_shared<ZinSim::Target>());
   ZinNet::ClientOptions client{2000, 2000, kToken};
@@ -139,8 +138,7 @@ TEST(Security, TlsCarriesTheTokenAndChecksTheCertificate) {
   EXPECT_EQ(server.server().stats().requestsServed, 2u);
 
   client.tlsCaFile = "";  // the system's authorities do not know the test certificate
-  EXPECT_NE(failureOf(client, server.port()).find("certificate verify failed"),
-            std::string::npos);
+  EXPECT_NE(failureOf(client, server.port()).find("certificate verify failed"), std::string::npos);
   client.tls = false;
   EXPECT_NE(failureOf(client, server.port()).find("127.0.0.1"), std::string::npos);
   EXPECT_EQ(server.server().stats().requestsServed, 2u);

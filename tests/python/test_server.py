@@ -17,10 +17,10 @@ from conftest import FULL
 class Server:
     """`zinmox serve` on a free loopback port, in a child process."""
 
-    def __init__(self):
+    def __init__(self, env=None):
         self.process = subprocess.Popen(
             [os.environ["ZINMOX_TOOL"], "serve", "--listen", "127.0.0.1:0"],
-            stdout=subprocess.PIPE, stderr=subprocess.STDOUT)
+            stdout=subprocess.PIPE, stderr=subprocess.STDOUT, env=env)
         self.target = None
         output = b""
         deadline = time.monotonic() + 20
@@ -66,3 +66,16 @@ def test_sessions_share_the_served_target_and_a_stopped_server_is_reported(serve
             one.write(async_out_data=2)
     with pytest.raises(ConnectionError, match="cannot connect to 127.0.0.1"):
         zinmox.Session(server.target)
+
+
+def test_a_token_server_takes_the_token_keyword():
+    token = "python-token-0123456789"
+    started = Server(env=dict(os.environ, ZINMOX_TOKEN=token))
+    try:
+        assert started.target
+        with pytest.raises(ConnectionError, match="does not know the token"):
+            zinmox.Session(started.target, token="another-token-0123456789")
+        with zinmox.Session(started.target, token=token) as session:
+            assert session.scan()
+    finally:
+        assert started.stop() == 0
