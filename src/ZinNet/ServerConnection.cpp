@@ -119,7 +119,9 @@ void ServerConnection::disarmTimer() {
 
 void ServerConnection::onReadError(std::error_code ec, const char* where) {
   if (closed_) return;
-  const bool ended = ec == asio::error::eof || ec == asio::error::connection_reset;
+  // A TLS client that closes without the layer's close notification truncates the stream.
+  const bool ended = ec == asio::error::eof || ec == asio::error::connection_reset ||
+                     ec == asio::ssl::error::stream_truncated;
   if (ended && std::strcmp(where, "between frames") == 0) {
     close("the client closed the connection");
     return;

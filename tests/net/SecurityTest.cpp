@@ -136,6 +136,9 @@ TEST(Security, TlsCarriesTheTokenAndChecksTheCertificate) {
   readOnce(transport);
   readOnce(transport);
   EXPECT_EQ(server.server().stats().requestsServed, 2u);
+  transport.disconnect();  // an ordinary end, not a refused frame
+  EXPECT_TRUE(server.waitUntilNoConnections(std::chrono::seconds(3)));
+  EXPECT_EQ(server.server().stats().framesRefused, 0u);
 
   client.tlsCaFile = "";  // the system's authorities do not know the test certificate
   EXPECT_NE(failureOf(client, server.port()).find("certificate verify failed"), std::string::npos);

@@ -56,6 +56,7 @@ TEST(HostText, HexVectorsRoundTripAndNeverCutBits) {
 TEST(HostText, Targets) {
   EXPECT_EQ(describeTarget(""), "the built-in demo design");
   EXPECT_EQ(describeTarget("tcp://127.0.0.1:7700"), "the target server at 127.0.0.1:7700");
+  EXPECT_EQ(describeTarget("tls://[::1]:7700"), "the target server at [::1]:7700 (TLS)");
   EXPECT_EQ(describeTarget("openocd://127.0.0.1:6666?board=ecp5"), "OpenOCD at 127.0.0.1:6666");
   for (const char* text : {"tcp://nohost", "openocd://127.0.0.1", "x://y"}) {
     try {
