@@ -8,6 +8,8 @@
 
 #include "NetTestUtil.h"
 #include "ZinNet/TcpTransport.h"
+#include "ZinNet/ZinNet.h"
+#include "ZinRT/ZinJtag.h"
 
 namespace {
 
@@ -136,6 +138,12 @@ TEST(Security, TlsCarriesTheTokenAndChecksTheCertificate) {
   readOnce(transport);
   readOnce(transport);
   EXPECT_EQ(server.server().stats().requestsServed, 2u);
+  // C hosts reach the same server through the options of ZinNet_openSessionWith.
+  const ZinNet_SessionOptions c{
+      "127.0.0.1", server.port(), 2000, kToken.c_str(), 1, options.tlsCertFile.c_str()};
+  const uint32_t handle = ZinNet_openSessionWith(&c);
+  EXPECT_NE(handle, 0u) << ZinNet_lastError();
+  ZinJtag_closeSession(handle);
   transport.disconnect();  // an ordinary end, not a refused frame
   EXPECT_TRUE(server.waitUntilNoConnections(std::chrono::seconds(3)));
   EXPECT_EQ(server.server().stats().framesRefused, 0u);
