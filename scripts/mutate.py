@@ -26,7 +26,7 @@ from pathlib import Path
 ROOT = Path(__file__).resolve().parent.parent
 
 # Test selections (ctest regular expressions) and the targets that build them.
-MOX = r"^(CallFrame|StatusRead|Ports|PortBits|SignalTable|WriteValues|ValueWire|ReadValues|Arrays|SignalGroup|BitFormat)\."
+MOX = r"^(CallFrame|StatusRead|Ports|PortBits|SignalTable|WriteValues|ReadValues|Arrays|BitFormat)\."
 MOX_TARGETS = ["zin_mox_tests"]
 SIM = r"^(ModelTest|ModelLargeCore|ModelThreads|EndToEnd|Description)\."
 SIM_TARGETS = ["zin_sim_tests"]

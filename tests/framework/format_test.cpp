@@ -1,15 +1,19 @@
-// The utility library's number texts, byte ranges and the rejection texts of malformed input; the
-// byte buffer's storage and bit fields. Every conversion against bit-by-bit references, over
-// random lengths, is in tests/stress.
+// The utility library's number texts and byte ranges, every word-at-a-time conversion against
+// bit-by-bit references over random lengths, the rejection texts of malformed input, and the byte
+// buffer's storage and bit fields.
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <cctype>
 #include <memory>
+#include <random>
 #include <stdexcept>
 #include <string>
 #include <vector>
 
 #include "ZinRT/Zin_ByteBuffer.h"
 #include "ZinRT/Zin_NumberUtil.h"
+#include "support/WireFormat.h"
 
 using ZinRT::Zin_ByteBuffer;
 using ZinRT::Zin_NumberUtil;
@@ -29,6 +33,11 @@ std::string rejection(Call call) {
     return e.what();
   }
   return "accepted";
+}
+
+std::string lowerCase(std::string text) {
+  for (char& c : text) c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+  return text;
 }
 
 }  // namespace
@@ -68,6 +77,41 @@ TEST(Format, NumbersAndByteRangesHaveKnownTexts) {
   EXPECT_EQ(Zin_NumberUtil::hexStr2BinStr(shared.c_str(), 8, shared), "00011010");
 }
 
+// Lengths that are not multiples of 4 or 8, so that every conversion meets its partial words.
+TEST(Format, ConversionsMatchBitByBitReferences) {
+  using ZinTest::bitsToHex;
+  using ZinTest::unpackBits;
+  std::mt19937 rng(2024);
+  std::string out;
+  for (int round = 0; round < 300; ++round) {
+    const auto n = static_cast<uint32_t>(rng() % 200);
+    std::vector<uint8_t> bytes(n / 8 + 2);
+    for (uint8_t& b : bytes) b = static_cast<uint8_t>(rng());
+    const std::string reverse = unpackBits(bytes.data(), n);  // character i is bit i
+    const std::string msbFirst(reverse.rbegin(), reverse.rend()), hex = bitsToHex(msbFirst);
+    EXPECT_EQ(Zin_NumberUtil::binStr2HexStr(msbFirst, out), hex) << n;
+    EXPECT_EQ(Zin_NumberUtil::hexStr2BinStr(hex.c_str(), n, out), msbFirst);
+    EXPECT_EQ(Zin_NumberUtil::hexStr2BinStr(lowerCase(hex).c_str(), n, out), msbFirst);
+    EXPECT_EQ(Zin_NumberUtil::bin2ReverseBinStr(bytes.data(), n, out), reverse);
+    std::vector<uint8_t> packed((n + 7) / 8 + 1, 0xEE);
+    Zin_NumberUtil::reverseBinStr2Bin(reverse, packed.data());
+    ASSERT_EQ(unpackBits(packed.data(), n), reverse) << n;
+    ASSERT_EQ(packed.back(), 0xEE) << "wrote past ceil(n/8) bytes, n = " << n;
+
+    const Zin_ByteBuffer buffer(bytes.data(), static_cast<uint32_t>(bytes.size()));
+    const auto start = static_cast<uint32_t>(rng() % 3);
+    std::unique_ptr<Zin_ByteBuffer> text(buffer.bin2HexString(start, n));
+    std::vector<uint8_t> tail(bytes.begin() + start, bytes.end());
+    tail.resize(n / 8 + 1, 0);  // bits past the buffer read as 0
+    const std::string tailBits = unpackBits(tail.data(), n);
+    EXPECT_EQ(std::string(text->ptr()), bitsToHex(std::string(tailBits.rbegin(), tailBits.rend())));
+    if (hex.empty()) continue;
+    std::unique_ptr<Zin_ByteBuffer> back(
+        textBuffer(lowerCase(hex)).hex2Bin(0, static_cast<uint32_t>(hex.size() - 1)));
+    ASSERT_EQ(unpackBits(back->uPtr(), n), reverse);
+  }
+}
+
 TEST(Format, MalformedInputIsRejectedWithItsText) {
   std::string out;
   EXPECT_EQ(rejection([&] { Zin_NumberUtil::binStr2HexStr("10x1", out); }),
@@ -80,6 +124,9 @@ TEST(Format, MalformedInputIsRejectedWithItsText) {
   EXPECT_EQ(rejection([&] { Zin_NumberUtil::hexStr2BinStr("Z1", 4, out); }),
             "Zin_NumberUtil::hexStr2BinStr: not a hexadecimal digit (character code 90)")
       << "digits above the kept bits are checked too";
+  EXPECT_EQ(rejection([&] { Zin_NumberUtil::hexStr2BinStr("x0G", 4, out); }),
+            "Zin_NumberUtil::hexStr2BinStr: not a hexadecimal digit (character code 71)")
+      << "the last bad digit is met first";
   EXPECT_EQ(rejection([&] { delete textBuffer("12G4").hex2Bin(0, 3); }),
             "Zin_ByteBuffer::hex2Bin: not a hexadecimal digit (character code 71)");
   // Sixteen digits are converted at once: a bad one among them is still reported as the

@@ -47,7 +47,7 @@ std::string whatOf(const std::function<void()>& call) {
 
 }  // namespace
 
-TEST(JtagSession, HandlesAreDistinctReachTheirTransportAndUnknownHandlesAreRejected) {
+TEST(JtagSession, HandlesReachTheirTransportAndMessagesTheirOwnSession) {
   auto transport = std::make_shared<ZinTestKit::ScriptedTransport>();
   const uint32_t a = ZinJtag_openSession(transport);
   const uint32_t b = openScripted();
@@ -60,6 +60,34 @@ TEST(JtagSession, HandlesAreDistinctReachTheirTransportAndUnknownHandlesAreRejec
   ZinJtag_session_withTransport(a, [&seen](ZinRT::Zin_Transport& t) { seen = &t; });
   EXPECT_EQ(seen, transport.get());
   EXPECT_THROW(ZinJtag_openSession(nullptr), std::invalid_argument);
+
+  Inbox inboxA, inboxB;
+  ZinJtag_setMessageHandler(a, &Inbox::handler, &inboxA);
+  ZinJtag_setMessageHandler(b, &Inbox::handler, &inboxB);
+  ZinJtag_session_sendMessage(a, ZINJTAG_MSG_ERROR, "first");
+  ZinJtag_session_sendMessage(b, ZINJTAG_MSG_ABORT, "other");
+  ZinJtag_session_sendMessage(a, ZINJTAG_MSG_ABORT, "second");
+  ZinJtag_session_sendMessage(a, ZINJTAG_MSG_ERROR, nullptr);
+  ASSERT_EQ(inboxA.messages.size(), 3u);
+  ASSERT_EQ(inboxB.messages.size(), 1u);
+  const auto expect = [](const Received& m, uint32_t handle, uint32_t code, const char* text) {
+    EXPECT_EQ(m.handle, handle);
+    EXPECT_EQ(m.code, code);
+    EXPECT_EQ(m.text, text);
+  };
+  expect(inboxA.messages[0], a, ZINJTAG_MSG_ERROR, "first");
+  expect(inboxA.messages[1], a, ZINJTAG_MSG_ABORT, "second");
+  expect(inboxA.messages[2], a, ZINJTAG_MSG_ERROR, "");
+  expect(inboxB.messages[0], b, ZINJTAG_MSG_ABORT, "other");
+  // A null handler restores the default one, which writes to standard error.
+  ZinJtag_setMessageHandler(a, nullptr, nullptr);
+  testing::internal::CaptureStderr();
+  ZinJtag_session_sendMessage(a, 0x100, "to stderr");
+  EXPECT_EQ(testing::internal::GetCapturedStderr(),
+            "ZinJtag[" + std::to_string(a) + "] code 0x0100: to stderr\n");
+  EXPECT_EQ(inboxA.messages.size(), 3u);
+
+  // A closed handle is refused everywhere, with its number in the text.
   ZinJtag_closeSession(a);
   EXPECT_THROW(ZinJtag_closeSession(a), std::invalid_argument);
   EXPECT_THROW(ZinJtag_session_sendMessage(a, ZINJTAG_MSG_ERROR, "x"), std::invalid_argument);
@@ -68,40 +96,6 @@ TEST(JtagSession, HandlesAreDistinctReachTheirTransportAndUnknownHandlesAreRejec
   EXPECT_THROW(ZinJtag_session_isLocked(a), std::invalid_argument);
   EXPECT_NE(whatOf([a] { ZinJtag_session_sendMessage(a, 1, "x"); }).find(std::to_string(a)),
             std::string::npos);
-  ZinJtag_closeSession(b);
-}
-
-TEST(JtagSession, MessagesReachTheirOwnSessionInOrder) {
-  const uint32_t a = openScripted();
-  const uint32_t b = openScripted();
-  Inbox inboxA;
-  Inbox inboxB;
-  ZinJtag_setMessageHandler(a, &Inbox::handler, &inboxA);
-  ZinJtag_setMessageHandler(b, &Inbox::handler, &inboxB);
-  ZinJtag_session_sendMessage(a, ZINJTAG_MSG_ERROR, "first");
-  ZinJtag_session_sendMessage(b, ZINJTAG_MSG_ABORT, "other");
-  ZinJtag_session_sendMessage(a, ZINJTAG_MSG_ABORT, "second");
-  ZinJtag_session_sendMessage(a, ZINJTAG_MSG_ERROR, nullptr);
-
-  ASSERT_EQ(inboxA.messages.size(), 3u);
-  EXPECT_EQ(inboxA.messages[0].text, "first");
-  EXPECT_EQ(inboxA.messages[0].code, ZINJTAG_MSG_ERROR);
-  EXPECT_EQ(inboxA.messages[1].text, "second");
-  EXPECT_EQ(inboxA.messages[1].code, ZINJTAG_MSG_ABORT);
-  EXPECT_EQ(inboxA.messages[2].text, "");
-  for (const auto& m : inboxA.messages) EXPECT_EQ(m.handle, a);
-  ASSERT_EQ(inboxB.messages.size(), 1u);
-  EXPECT_EQ(inboxB.messages[0].text, "other");
-  EXPECT_EQ(inboxB.messages[0].handle, b);
-
-  // A null handler restores the default one, which writes to standard error.
-  ZinJtag_setMessageHandler(a, nullptr, nullptr);
-  testing::internal::CaptureStderr();
-  ZinJtag_session_sendMessage(a, 0x100, "to stderr");
-  const std::string err = testing::internal::GetCapturedStderr();
-  EXPECT_EQ(err, "ZinJtag[" + std::to_string(a) + "] code 0x0100: to stderr\n");
-  EXPECT_EQ(inboxA.messages.size(), 3u);
-  ZinJtag_closeSession(a);
   ZinJtag_closeSession(b);
 }
 
@@ -134,19 +128,6 @@ TEST(JtagSession, TargetLockIsReentrantCountedAndTimesOutForAnotherThread) {
   ZinJtag_closeSession(h);
 }
 
-TEST(JtagSession, SessionClosedWhileLockedStaysValidForTheLock) {
-  auto transport = std::make_shared<ZinTestKit::ScriptedTransport>();
-  std::weak_ptr<ZinTestKit::ScriptedTransport> watch = transport;
-  const uint32_t h = ZinJtag_openSession(std::move(transport));
-  {
-    ZinJtagTargetLock lock(h, 1000);
-    ZinJtag_closeSession(h);
-    EXPECT_THROW(ZinJtag_session_isLocked(h), std::invalid_argument);
-    EXPECT_FALSE(watch.expired());  // the lock still holds the session
-  }
-  EXPECT_TRUE(watch.expired());  // released with the last lock
-}
-
 namespace {
 std::vector<uint32_t> closedHandles;
 std::vector<bool> openDuringHook;
@@ -162,14 +143,24 @@ void recordClose(uint32_t handle) {
 }
 }  // namespace
 
-TEST(JtagSession, CloseHooksRunOnceWhileTheSessionIsStillOpen) {
+// Close hooks run once per close while the session is still open; a session closed while its lock
+// is held stays alive for the lock.
+TEST(JtagSession, CloseRunsHooksOnceAndKeepsALockedSessionForItsLock) {
   ZinJtag_addSessionCloseHook(&recordClose);
   ZinJtag_addSessionCloseHook(&recordClose);  // registered once
+  EXPECT_THROW(ZinJtag_addSessionCloseHook(nullptr), std::invalid_argument);
   closedHandles.clear();
   openDuringHook.clear();
-  const uint32_t h = openScripted();
-  ZinJtag_closeSession(h);
-  EXPECT_EQ(closedHandles, std::vector<uint32_t>{h});
-  EXPECT_EQ(openDuringHook, std::vector<bool>{true});
-  EXPECT_THROW(ZinJtag_addSessionCloseHook(nullptr), std::invalid_argument);
+  auto transport = std::make_shared<ZinTestKit::ScriptedTransport>();
+  std::weak_ptr<ZinTestKit::ScriptedTransport> watch = transport;
+  const uint32_t h = ZinJtag_openSession(std::move(transport));
+  {
+    ZinJtagTargetLock lock(h, 1000);
+    ZinJtag_closeSession(h);
+    EXPECT_EQ(closedHandles, std::vector<uint32_t>{h});
+    EXPECT_EQ(openDuringHook, std::vector<bool>{true});
+    EXPECT_THROW(ZinJtag_session_isLocked(h), std::invalid_argument);
+    EXPECT_FALSE(watch.expired());  // the lock still holds the session
+  }
+  EXPECT_TRUE(watch.expired());  // released with the last lock
 }

@@ -3,6 +3,7 @@
 
 #include <stdexcept>
 #include <string>
+#include <vector>
 
 #include "ZinHub/Crc16.h"
 #include "ZinHub/HubCodec.h"
@@ -39,7 +40,7 @@ BitVector statusRecord() {
   return record;
 }
 
-TEST(HubCrc, KnownValuesAndZeroResidue) {
+TEST(HubCodec, CrcHasKnownValuesAndZeroResidueAndGuardsRequestsAndReplies) {
   const struct {
     std::string data;
     uint16_t crc;
@@ -50,31 +51,22 @@ TEST(HubCrc, KnownValuesAndZeroResidue) {
     appendCrc(bits, c.crc);
     EXPECT_EQ(crc16(bits, 0, bits.size()), 0) << '"' << c.data << '"';
   }
-}
-
-TEST(HubCodec, StageRequestCarriesItsCrc) {
   BitVector data;
   appendNumber(data, 0x2D, 7);
   const BitVector stage = stageRequest(3, data);
   ASSERT_EQ(stage.size(), 16U + 7 + 16);
   EXPECT_EQ(readNumber(stage, 0, 16), 0xA531U);  // op 1, core 3, key
   EXPECT_EQ(crc16(stage, 16, 7 + 16), 0);        // the hub's register ends at 0
-}
 
-TEST(HubCodec, StatusReplyFillsInfoAndStatus) {
-  const StatusRecord record = parseStatusReply(hubReply(statusRecord()), "core at 0:1:0");
-  EXPECT_EQ(record.info.manufacturerId, 0xA5U);
-  EXPECT_EQ(record.info.coreType, 9U);
-  EXPECT_EQ(record.info.coreMajorVersion, 10U);
-  EXPECT_EQ(record.info.coreMinorVersion, 2U);
-  EXPECT_EQ(record.info.coreRevision, 1U);
+  const BitVector good = hubReply(statusRecord());
+  const StatusRecord record = parseStatusReply(good, "core at 0:1:0");
+  const ZIN_CORE_INFO& info = record.info;
+  EXPECT_EQ((std::vector<uint32_t>{info.manufacturerId, info.coreType, info.coreMajorVersion,
+                                   info.coreMinorVersion, info.coreRevision}),
+            (std::vector<uint32_t>{0xA5, 9, 10, 2, 1}));
   EXPECT_EQ(record.status[0], 0xA5);
   EXPECT_EQ(record.status[5], 0x89);  // record bit 40 starts byte 5
   EXPECT_EQ(record.status[15], 0xFF);
-}
-
-TEST(HubCodec, EveryCorruptedBitIsDetected) {
-  const BitVector good = hubReply(statusRecord());
   for (size_t bit = 16; bit < good.size(); ++bit) {
     BitVector bad = good;
     bad[bit] ^= 1;
@@ -82,10 +74,10 @@ TEST(HubCodec, EveryCorruptedBitIsDetected) {
   }
   BitVector hub;
   appendNumber(hub, 0x0301, 32);
-  BitVector info = hubReply(hub);
-  ASSERT_EQ(parseInfoReply(info)->coreCount, 3U);
-  info[40] ^= 1;
-  EXPECT_THROW(parseInfoReply(info), std::runtime_error);
+  BitVector hubInfo = hubReply(hub);
+  ASSERT_EQ(parseInfoReply(hubInfo)->coreCount, 3U);
+  hubInfo[40] ^= 1;
+  EXPECT_THROW(parseInfoReply(hubInfo), std::runtime_error);
 }
 
 TEST(HubCodec, ChainsWithoutHubMeanNoCore) {

@@ -191,28 +191,6 @@ TEST_F(WriteValues, AnEmptyMapSendsTheImageWithNothingMarked) {
   EXPECT_EQ(transport->transfers().size(), 2u);
 }
 
-using ValueWire = SessionFixture;
-
-TEST_F(ValueWire, DefineABusWriteItAndDecodeTheWire) {
-  ZinTestKit::MoxStatus status;
-  status.asyncOutputCount = 8;
-  status.syncOutputCount = 2;
-  transport->placeMoxCore(ref, status);
-  ASSERT_EQ(ZinMOX_initCore(handle, &ref), 0u);
-  ASSERT_EQ(defineBus("ctl", ZINMOX_ASYNC_OUTPUT, {5, 1, 7, 0}), 0u);
-  // Value bits 1 and 3 of A land on port bits 1 and 0; ports 5, 1, 7, 0 are marked.
-  for (ZinMOX_ValueMap map : {ZinMOX_ValueMap{{"ctl", "A"}}, {{"sync_out_data", "2"}}}) {
-    uintptr_t word = mapWord(map);
-    ASSERT_EQ(ZinMOX_writeValues(handle, &ref, &word), 0u);
-  }
-  const auto sent = transport->transfers();
-  ASSERT_EQ(sent.size(), 2u);
-  EXPECT_EQ(sent[0].text, "01 2 0 01 0 00000033 3000000000314\n01 2 0 02 0 00000004 0");
-  EXPECT_EQ(sent[1].text, "01 2 0 01 0 00000033 3000003FFFC03\n01 2 0 02 0 00000004 0");
-  EXPECT_EQ(transport->flushCount(), 2u);
-  expectNoMessages();
-}
-
 class ReadValues : public SessionFixture {
  protected:
   uint32_t read(ZinMOX_ValueMap& map) {

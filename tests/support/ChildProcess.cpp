@@ -15,6 +15,7 @@
 #include <chrono>
 #include <filesystem>
 #include <fstream>
+#include <functional>
 #include <sstream>
 #include <stdexcept>
 #include <thread>
@@ -70,6 +71,32 @@ std::string readFile(const std::string& path) {
   return text.str();
 }
 
+// Starts `path` with `args` and the file actions (which it destroys); -1 when it cannot start.
+pid_t spawn(const std::string& path, const std::vector<std::string>& args,
+            posix_spawn_file_actions_t& actions) {
+  std::vector<char*> argv{const_cast<char*>(path.c_str())};
+  for (const std::string& arg : args) argv.push_back(const_cast<char*>(arg.c_str()));
+  argv.push_back(nullptr);
+  pid_t pid = -1;
+  const int rc = posix_spawn(&pid, path.c_str(), &actions, nullptr, argv.data(), environ);
+  posix_spawn_file_actions_destroy(&actions);
+  return rc == 0 ? pid : -1;
+}
+
+// Waits for `pid` until `end`, killing it then; its wait status.
+int reap(pid_t pid, Clock::time_point end, const std::function<void()>& meanwhile) {
+  int status = 0;
+  while (waitpid(pid, &status, WNOHANG) == 0) {
+    if (msLeft(end) == 0) {
+      kill(pid, SIGKILL);
+      waitpid(pid, &status, 0);
+      return -1;
+    }
+    meanwhile();
+  }
+  return status;
+}
+
 }  // namespace
 
 std::string writeTempFile(const std::string& name, const std::string& text) {
@@ -85,31 +112,19 @@ ProcessResult runProcess(const std::string& path, const std::vector<std::string>
   const std::string in = writeTempFile("in_" + id, input);
   const std::string out = (tempFolder() / ("out_" + id)).string();
   const std::string err = (tempFolder() / ("err_" + id)).string();
-  std::vector<char*> argv{const_cast<char*>(path.c_str())};
-  for (const std::string& arg : args) argv.push_back(const_cast<char*>(arg.c_str()));
-  argv.push_back(nullptr);
   posix_spawn_file_actions_t actions;
   posix_spawn_file_actions_init(&actions);
   posix_spawn_file_actions_addopen(&actions, 0, in.c_str(), O_RDONLY, 0);
   posix_spawn_file_actions_addopen(&actions, 1, out.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
   posix_spawn_file_actions_addopen(&actions, 2, err.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
-  pid_t pid = -1;
-  const int rc = posix_spawn(&pid, path.c_str(), &actions, nullptr, argv.data(), environ);
-  posix_spawn_file_actions_destroy(&actions);
-  if (rc != 0) throw std::runtime_error("cannot start " + path);
-  const auto end = Clock::now() + std::chrono::milliseconds(timeoutMs);
-  int status = 0;
-  while (waitpid(pid, &status, WNOHANG) == 0) {
-    if (msLeft(end) == 0) {
-      kill(pid, SIGKILL);
-      waitpid(pid, &status, 0);
-      break;
-    }
-    std::this_thread::sleep_for(std::chrono::milliseconds(5));
-  }
+  const pid_t pid = spawn(path, args, actions);
+  if (pid < 0) throw std::runtime_error("cannot start " + path);
+  const int status = reap(pid, Clock::now() + std::chrono::milliseconds(timeoutMs),
+                          [] { std::this_thread::sleep_for(std::chrono::milliseconds(5)); });
   ProcessResult result;
-  if (WIFEXITED(status)) result.status = WEXITSTATUS(status);
-  if (WIFSIGNALED(status)) result.signal = WTERMSIG(status);
+  if (status == -1) result.signal = SIGKILL;
+  if (status != -1 && WIFEXITED(status)) result.status = WEXITSTATUS(status);
+  if (status != -1 && WIFSIGNALED(status)) result.signal = WTERMSIG(status);
   result.out = readFile(out);
   result.err = readFile(err);
   return result;
@@ -118,21 +133,14 @@ ProcessResult runProcess(const std::string& path, const std::vector<std::string>
 ChildProcess::ChildProcess(const std::string& path, const std::vector<std::string>& args) {
   int fds[2];
   if (pipe2(fds, O_CLOEXEC) != 0) throw std::runtime_error("pipe failed");
-  std::vector<char*> argv{const_cast<char*>(path.c_str())};
-  for (const std::string& arg : args) argv.push_back(const_cast<char*>(arg.c_str()));
-  argv.push_back(nullptr);
   posix_spawn_file_actions_t actions;
   posix_spawn_file_actions_init(&actions);
   posix_spawn_file_actions_adddup2(&actions, fds[1], 1);
   posix_spawn_file_actions_adddup2(&actions, fds[1], 2);
-  const int rc = posix_spawn(&pid_, path.c_str(), &actions, nullptr, argv.data(), environ);
-  posix_spawn_file_actions_destroy(&actions);
+  pid_ = spawn(path, args, actions);
   close(fds[1]);
   out_ = fds[0];
-  if (rc != 0) {
-    pid_ = -1;
-    throw std::runtime_error("cannot start " + path);
-  }
+  if (pid_ < 0) throw std::runtime_error("cannot start " + path);
 }
 
 ChildProcess::~ChildProcess() {
@@ -177,17 +185,9 @@ void ChildProcess::signal(int number) {
 
 int ChildProcess::wait(int timeoutMs) {
   const auto end = Clock::now() + std::chrono::milliseconds(timeoutMs);
-  int status = 0;
-  while (waitpid(pid_, &status, WNOHANG) == 0) {
-    if (msLeft(end) == 0) {
-      kill(pid_, SIGKILL);
-      waitpid(pid_, &status, 0);
-      pid_ = -1;
-      return -1;
-    }
-    drain(std::min(msLeft(end), 20));
-  }
+  const int status = reap(pid_, end, [this, end] { drain(std::min(msLeft(end), 20)); });
   pid_ = -1;
+  if (status == -1) return -1;
   drain(0);
   return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
 }
