@@ -164,11 +164,13 @@ void ServerConnection::onPrefix(std::error_code ec, size_t n) {
   }
   prefixBytes_ = 0;
   const uint32_t length = decodeLength(prefix_.data());
+  // Between the hello and the token proof only the small token frames may come.
+  const uint32_t limit = greeted_ && !admitted_ ? kMaxTokenFrame : state_->options.maxFrameBytes;
   if (length == 0) {
     refuse("frame of length 0", true);
-  } else if (length > state_->options.maxFrameBytes) {
+  } else if (length > limit) {
     refuse("frame of " + std::to_string(length) + " bytes exceeds the limit of " +
-               std::to_string(state_->options.maxFrameBytes) + " bytes",
+               std::to_string(limit) + " bytes",
            true);
   } else {
     readBody(length);

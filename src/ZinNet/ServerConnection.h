@@ -73,6 +73,7 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   std::vector<unsigned char> outgoing_;
   std::array<unsigned char, 4096> scratch_{};
   static constexpr uint32_t kLingerMs = 1000;
+  static constexpr uint32_t kMaxTokenFrame = 64;  // the token frames have 33 bytes
   bool greeted_ = false;
   bool admitted_ = false;    // greeted, and the token proven when the server has one
   bool challenged_ = false;  // a token challenge was sent

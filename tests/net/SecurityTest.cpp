@@ -73,12 +73,13 @@ TEST(Security, NoRequestIsServedBeforeTheTokenIsProven) {
     client.send(frame(kTokenProof, recorded));
     EXPECT_EQ(client.readFrame()->type, kAccepted);
   }
-  // The recorded proof replayed on a new connection, a wrong proof, a request without a proof.
-  for (const Bytes& proof : {recorded, Bytes(32, 0), Bytes{}}) {
+  // The recorded proof replayed on a new connection, a wrong proof, a request without a proof,
+  // a frame beyond what a token frame needs.
+  for (const Bytes& proof : {recorded, Bytes(32, 0), Bytes{}, Bytes(64, 1)}) {
     RawClient client(server.port());
-    if (proof.empty()) {
+    if (proof.size() != 32) {
       client.greet();
-      client.send(frame(kFlush));
+      client.send(proof.empty() ? frame(kFlush) : frame(kTokenProof, proof));
     } else {
       challenge(client, clientNonce);
       client.send(frame(kTokenProof, proof));
