@@ -28,9 +28,9 @@ ROOT = Path(__file__).resolve().parent.parent
 # Test selections (ctest regular expressions) and the targets that build them.
 MOX = r"^(CallFrame|StatusRead|Ports|PortBits|SignalTable|WriteValues|ReadValues|Arrays|BitFormat)\."
 MOX_TARGETS = ["zin_mox_tests"]
-SIM = r"^(ModelTest|ModelLargeCore|ModelThreads|EndToEnd|Description)\."
+SIM = r"^(ModelTest|ModelLargeCore|ModelThreads|Description)\."
 SIM_TARGETS = ["zin_sim_tests"]
-TOOL = r"^(HostText|ClientCases|ErrorPaths|Script|JsonOutput|Demo|Serve)\."
+TOOL = r"^(HostText|ClientCases|ErrorPaths|Script|JsonOutput|Demo)\."
 TOOL_TARGETS = ["zinmox_tool_tests", "zinmox"]
 PYTHON = r"^python_"
 PYTHON_TARGETS = ["zinmox_python", "zinmox"]

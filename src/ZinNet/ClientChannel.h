@@ -40,6 +40,8 @@ class ClientChannel {
   uint32_t serverMaxFrame() const { return serverMaxFrame_; }
   uint32_t serverMaxRead() const { return serverMaxRead_; }
   std::string serverText() const { return endpoint_.text(); }
+  /// The protocol version agreed in the greeting.
+  uint16_t version() const { return version_; }
 
  private:
   using Clock = std::chrono::steady_clock;
@@ -54,7 +56,8 @@ class ClientChannel {
 
   void connectNow();
   void startTls(Clock::time_point deadline);
-  void greet(Clock::time_point deadline);
+  /// False when the server refused `version` and an older one is left to try.
+  bool greet(Clock::time_point deadline, uint16_t version);
   void proveToken(const Nonce& clientNonce, Clock::time_point deadline);
   bool closedByPeer();
   void await(const std::shared_ptr<OpState>& state, Clock::time_point deadline,
@@ -74,6 +77,7 @@ class ClientChannel {
   std::string serverName_;
   uint32_t serverMaxFrame_ = 0;
   uint32_t serverMaxRead_ = 0;
+  uint16_t version_ = 0;
 };
 
 }  // namespace ZinNet

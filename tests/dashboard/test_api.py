@@ -32,6 +32,9 @@ CASES = [
     ("POST", "/api/live", {"rate_hz": 0.5}, None, 400, "between 1 and 50"),
     ("POST", "/api/live", {"rate_hz": 51}, None, 400, "between 1 and 50"),
     ("POST", "/api/live", {"paused": "yes"}, None, 400, "true or false"),
+    ("POST", "/api/live", {"core": "0:1:3"}, None, 404, "no MOX core at 0:1:3"),
+    ("POST", "/api/live", {"core": "0:2:0"}, None, 404, "no MOX core at 0:2:0"),
+    ("POST", "/api/live", {"core": "0:1"}, None, 400, "malformed core"),
     ("POST", "/api/live", b"{" + b" " * 16382 + b"}", None, 200, ""),  # the largest body
     ("POST", "/api/live", b"{" + b" " * 16383 + b"}", None, 413, "larger than 16384 bytes"),
     ("POST", "/api/live", b"{}", {"Content-Type": "text/plain"}, 415, "application/json"),

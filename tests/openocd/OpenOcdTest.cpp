@@ -1,8 +1,10 @@
-// The hub transport through OpenOCD and zinmox-rtlsim: the exported functions give the simulated
-// target's results, and every fault (no OpenOCD, OpenOCD or the model dying mid-call, a board
-// that does not match, an empty chain, a corrupted scan, a silent server) is a clear error.
+// zinmox-rtlsim with OpenOCD attached, on free loopback ports and always stopped: the exported
+// functions through the hub transport give the simulated target's results, and every fault (no
+// OpenOCD, OpenOCD or the model dying mid-call, a board that does not match, an empty chain, a
+// corrupted scan, a silent server, junk and vanishing bit-bang clients) is a clear error.
 #include <gtest/gtest.h>
 #include <netinet/in.h>
+#include <signal.h>
 #include <sys/socket.h>
 #include <unistd.h>
 
@@ -11,18 +13,72 @@
 #include <sstream>
 #include <thread>
 
-#include "OpenOcdRig.h"
 #include "ZinHub/BoardFile.h"
 #include "ZinHub/OpenOcdTarget.h"
 #include "ZinMOX/ZinMOX.h"
 #include "ZinOpenOcd/ZinOpenOcd.h"
 #include "ZinRT/ZinJtag.h"
 #include "ZinSim/Target.h"
+#include "support/ChildProcess.h"
 
 namespace ZinRtlTest {
 namespace {
 
+using namespace ZinTest;
 using ZinRT::ZinMOX_ValueMap;
+constexpr int kStartMs = 10000;
+
+// Starts zinmox-rtlsim on a free port; its port, or -1.
+int startRtlsim(std::unique_ptr<ChildProcess>& child, const std::string& idleTimeout) {
+  child = std::make_unique<ChildProcess>(
+      ZINMOX_RTLSIM_PATH, std::vector<std::string>{"--port", "0", "--idle-timeout", idleTimeout});
+  const std::string port = child->waitForMatch(std::regex("127\\.0\\.0\\.1:([0-9]+)"), kStartMs);
+  return port.empty() ? -1 : std::stoi(port);
+}
+
+// The model and OpenOCD attached to it; either can be killed and started again (OpenOCD keeps
+// its Tcl port).
+class OpenOcdRig {
+ public:
+  OpenOcdRig() : tclPort_(freeLoopbackPort()) { restart(); }
+  bool ok() const { return openocd_ != nullptr; }
+  int tclPort() const { return tclPort_; }
+  std::string target(const std::string& options = "") const {
+    return "openocd://127.0.0.1:" + std::to_string(tclPort_) + options;
+  }
+  std::string log() const {
+    return (rtlsim_ ? rtlsim_->output() : "") + (openocd_ ? openocd_->output() : "");
+  }
+  void kill(std::unique_ptr<ChildProcess>& child) {
+    child->signal(SIGKILL);
+    child->wait(kStartMs);
+    child.reset();
+  }
+  bool restart() {
+    if (!rtlsim_) {
+      if (openocd_) kill(openocd_);  // OpenOCD does not find a new bit-bang server by itself
+      rtlsimPort_ = startRtlsim(rtlsim_, "0");
+      if (rtlsimPort_ < 0) return false;
+    }
+    if (openocd_) return true;
+    openocd_ = std::make_unique<ChildProcess>(
+        ZINMOX_OPENOCD_PATH,
+        std::vector<std::string>{"-c", "set ZINMOX_RTLSIM_PORT " + std::to_string(rtlsimPort_),
+                                 "-f", ZINMOX_OPENOCD_CFG, "-c",
+                                 "bindto 127.0.0.1; tcl_port " + std::to_string(tclPort_) +
+                                     "; telnet_port disabled; gdb_port disabled"});
+    const int fd = openocd_->waitForOutput("tap/device found", kStartMs)
+                       ? connectLoopback(tclPort_, kStartMs)
+                       : -1;
+    if (fd < 0) openocd_.reset();
+    if (fd >= 0) close(fd);
+    return fd >= 0;
+  }
+  std::unique_ptr<ChildProcess> rtlsim_, openocd_;
+
+ private:
+  int tclPort_, rtlsimPort_ = -1;
+};
 
 ZinHub::OpenOcdTarget parse(const std::string& text) {
   return *ZinHub::parseOpenOcdTarget(text);
@@ -52,9 +108,12 @@ struct Host {
   }
   ~Host() { ZinJtag_closeSession(handle); }
 
-  std::string text(uint32_t rc, const ZinMOX_ValueMap& values) {
+  // The return code and the value map after a call of getCoreInfo, writeValues or readValues.
+  std::string call(uint32_t (*function)(uint32_t, ZIN_CORE_REF*, uintptr_t*), ZIN_CORE_REF ref,
+                   ZinMOX_ValueMap values = {}) {
+    uintptr_t word = reinterpret_cast<uintptr_t>(&values);
     std::ostringstream out;
-    out << "rc " << rc;
+    out << "rc " << function(handle, &ref, &word);
     for (const auto& [key, value] : values) out << " " << key << "=" << value;
     return out.str();
   }
@@ -65,20 +124,6 @@ struct Host {
     for (const auto& r : refs)
       out += std::to_string(r.userChainNumber) + ":" + std::to_string(r.coreIndex) + " ";
     return out;
-  }
-  std::string info(ZIN_CORE_REF ref) {
-    ZinMOX_ValueMap values;
-    uintptr_t word = reinterpret_cast<uintptr_t>(&values);
-    return text(ZinMOX_getCoreInfo(handle, &ref, &word), values);
-  }
-  std::string write(ZIN_CORE_REF ref, ZinMOX_ValueMap values) {
-    uintptr_t word = reinterpret_cast<uintptr_t>(&values);
-    return text(ZinMOX_writeValues(handle, &ref, &word), {});
-  }
-  std::string read(ZIN_CORE_REF ref) {
-    ZinMOX_ValueMap values;
-    uintptr_t word = reinterpret_cast<uintptr_t>(&values);
-    return text(ZinMOX_readValues(handle, &ref, &word), values);
   }
   std::string ports(ZIN_CORE_REF ref, uint8_t async) {
     const uint8_t mask = 0xFF;
@@ -97,7 +142,8 @@ struct Host {
 // each giving a text that must be the same on both targets.
 std::vector<std::string> exercise(Host& host) {
   std::vector<std::string> out{host.scan()};
-  for (uint32_t core = 0; core < 4; ++core) out.push_back(host.info({0, 1, core}));
+  for (uint32_t core = 0; core < 4; ++core)
+    out.push_back(host.call(ZinMOX_getCoreInfo, {0, 1, core}));
   ZIN_CORE_REF ref{0, 1, 1};
   out.push_back(std::to_string(ZinMOX_initCore(host.handle, &ref)));
   const uint32_t bits[] = {0, 1, 2, 3, 4, 5, 6, 7};
@@ -105,17 +151,17 @@ std::vector<std::string> exercise(Host& host) {
   ZinMOX_defineBus(host.handle, &ref, "in", ZINMOX_ASYNC_INPUT, bits, 8);
   ZinMOX_defineSignal(host.handle, &ref, "s", ZINMOX_SYNC_OUTPUT, 0);
   ZinMOX_defineSignal(host.handle, &ref, "sin", ZINMOX_SYNC_INPUT, 0);
-  host.write(ref, {{"out", "00"}, {"s.pulsetrain", "0000"}});
-  host.read(ref);  // clears what earlier runs left in the latches
+  host.call(ZinMOX_writeValues, ref, {{"out", "00"}, {"s.pulsetrain", "0000"}});
+  host.call(ZinMOX_readValues, ref);  // clears what earlier runs left in the latches
   for (const char* value : {"5A", "0F", "F0"}) {
-    out.push_back(host.write(ref, {{"out", value}}));
-    out.push_back(host.read(ref));
+    out.push_back(host.call(ZinMOX_writeValues, ref, {{"out", value}}));
+    out.push_back(host.call(ZinMOX_readValues, ref));
   }
   out.push_back(host.ports(ref, 0xC3));
   out.push_back(host.ports(ref, 0x3C));
   for (const char* train : {"FFFF", "0000"}) {
-    out.push_back(host.write(ref, {{"s.pulsetrain", train}}));
-    out.push_back(host.read(ref));
+    out.push_back(host.call(ZinMOX_writeValues, ref, {{"s.pulsetrain", train}}));
+    out.push_back(host.call(ZinMOX_readValues, ref));
   }
   return out;
 }
@@ -234,11 +280,7 @@ TEST_F(OpenOcdTest, DeathMidCallFailsThatCallAndTheNextCallReconnects) {
       return error;
     });
     std::this_thread::sleep_for(std::chrono::milliseconds(300));
-    if (model) {
-      rig_.killRtlsim();
-    } else {
-      rig_.killOpenOcd();
-    }
+    rig_.kill(model ? rig_.rtlsim_ : rig_.openocd_);
     const std::string error = calls.get();
     EXPECT_NE(error.find("OpenOCD at 127.0.0.1:" + std::to_string(rig_.tclPort())),
               std::string::npos)
@@ -272,6 +314,40 @@ TEST(OpenOcdFaults, NoOpenOcdOrASilentOneIsAClearErrorWithinTheTimeout) {
   EXPECT_NE(errorOf([&] { ZinHub::openOpenOcd(parse(target)); }).find("no answer within 300 ms"),
             std::string::npos);
   close(fd);
+}
+
+// The model's bit-bang server: junk and clients that vanish or stay silent leave it working;
+// SIGTERM stops it; --help and a bad option.
+TEST(OpenOcdFaults, RtlsimSurvivesJunkAndVanishingClients) {
+  std::unique_ptr<ChildProcess> rtlsim;
+  const int port = startRtlsim(rtlsim, "1");
+  ASSERT_GT(port, 0) << rtlsim->output();
+  auto exchange = [](int fd, const std::string& data) {
+    send(fd, data.data(), data.size(), MSG_NOSIGNAL);
+    timeval wait{5, 0};
+    setsockopt(fd, SOL_SOCKET, SO_RCVTIMEO, &wait, sizeof wait);
+    char reply = 0;
+    const std::string answer = recv(fd, &reply, 1, 0) == 1 ? std::string(1, reply) : "";
+    close(fd);
+    return answer;
+  };
+  std::string junk;
+  for (size_t i = 0; i < 100000; ++i) junk += static_cast<char>(i * 131 % 251);
+  std::erase(junk, 'Q');
+  int fd = connectLoopback(port, kStartMs);
+  send(fd, junk.data(), junk.size(), MSG_NOSIGNAL);
+  close(fd);  // vanishes with replies unread
+  // Resets released, Test-Logic-Reset, Run-Test/Idle, Select-DR, Capture-DR, Shift-DR, TCK
+  // low: TDO shows bit 0 of the IDCODE (1).
+  EXPECT_EQ(exchange(connectLoopback(port, kStartMs), "r2626262626042604040R"), "1");
+  fd = connectLoopback(port, kStartMs);  // a silent client is dropped after the idle timeout
+  EXPECT_EQ(exchange(connectLoopback(port, kStartMs), "R").size(), 1U);
+  close(fd);
+  rtlsim->signal(SIGTERM);
+  EXPECT_EQ(rtlsim->wait(kStartMs), 0) << rtlsim->output();
+  EXPECT_NE(rtlsim->output().find("stopped (signal)"), std::string::npos);
+  EXPECT_EQ(ChildProcess(ZINMOX_RTLSIM_PATH, {"--help"}).wait(kStartMs), 0);
+  EXPECT_EQ(ChildProcess(ZINMOX_RTLSIM_PATH, {"--clock-ratio", "3/0"}).wait(kStartMs), 2);
 }
 
 TEST(OpenOcdFaults, MalformedTargetTexts) {

@@ -1,5 +1,5 @@
 """The Python half of the shared client cases (tests/tools/client_cases.json): the module accepts
-and refuses the same reference, value, bit-list and name texts as the zinmox tool."""
+and refuses the same reference, value, bit-list, name and target texts as the zinmox tool."""
 
 import json
 import pathlib
@@ -48,3 +48,8 @@ def test_bit_lists_and_names(core, entry):
             assert core.sizes("x") == entry["width"]
     else:
         outcome(entry, lambda: core.define(entry["text"], "async_out", 0))
+
+
+@pytest.mark.parametrize("entry", CASES["targets"], ids=lambda e: e["text"])
+def test_targets(entry):
+    outcome(entry, lambda: zinmox.Session(entry["text"]))

@@ -2,6 +2,7 @@
 #include <gtest/gtest.h>
 
 #include <fstream>
+#include <optional>
 
 #include "SimTestUtil.h"
 #include "ZinSim/DescriptionJson.h"
@@ -15,30 +16,15 @@ std::string withCore(const std::string& core) {
   return R"({"devices": [{"index": 1, "chains": [{"number": 2, "cores": [)" + core + "]}]}]}";
 }
 
-TEST(Description, ReadsEveryFieldOfACore) {
-  const ZinSim::TargetDescription d = ZinSim::parseDescription(withCore(R"({
-      "index": 7, "name": "probe", "manufacturer_id": "0x1A5", "type": 9,
-      "major_version": 10, "minor_version": 3, "revision": 4,
-      "qx_version": {"major": 2, "minor": 17, "alpha": 1},
-      "async_inputs": 5, "sync_inputs": 6, "async_outputs": 3, "sync_outputs": 2,
-      "clock": {"cycles_per_sequence": 0},
-      "wiring": [{"input": "sync", "first": 4, "count": 2,
-                  "source": {"kind": "square", "period": 10, "phase": 3}}]})"));
-  ASSERT_EQ(d.cores.size(), 1u);
-  const ZinSim::CoreDescription& c = d.cores[0];
-  EXPECT_EQ(c.ref.deviceIndex, 1u);
-  EXPECT_EQ(c.ref.userChainNumber, 2u);
-  EXPECT_EQ(c.ref.coreIndex, 7u);
-  EXPECT_EQ(c.manufacturerId, 0x1A5u);
-  EXPECT_EQ(c.qxMinorVersion, 17u);
-  EXPECT_EQ(c.syncInputs, 6u);
-  EXPECT_EQ(c.cyclesPerSequence, 0u);
-  ASSERT_EQ(c.wiring.size(), 1u);
-  EXPECT_EQ(c.wiring[0].source.kind, ZinSim::InputSource::Kind::Square);
-  EXPECT_EQ(c.wiring[0].source.phase, 3u);
-  // The nlohmann overload reads the same.
-  const auto again = ZinSim::descriptionFromJson(nlohmann::json::parse(withCore(R"({"type": 3})")));
-  EXPECT_EQ(again.cores[0].type, 3u);
+// The description error that `call` throws, if any.
+template <class Call>
+std::optional<DescriptionError> errorOf(Call&& call) {
+  try {
+    call();
+  } catch (const DescriptionError& e) {
+    return e;
+  }
+  return std::nullopt;
 }
 
 TEST(Description, EveryProblemIsNamedByItsPointer) {
@@ -56,7 +42,6 @@ TEST(Description, EveryProblemIsNamedByItsPointer) {
       {R"({"devices": [], "extra": 1})", "/extra", "unknown key"},
       {R"({"devices": [{"index": 256}]})", "/devices/0/index",
        "expected a number from 0 to 255, found 256"},
-      {R"({"devices": [{"index": -1}]})", "/devices/0/index", "found -1"},
       {R"({"devices": [{"index": 3}, {"index": 3}]})", "/devices/1/index",
        "device 3 is described twice"},
       {R"({"devices": [{"chains": [{"number": 16}]}]})", "/devices/0/chains/0/number",
@@ -72,8 +57,6 @@ TEST(Description, EveryProblemIsNamedByItsPointer) {
        "does not fit the status word of version 5.0 (at most 255)"},
       {withCore(R"({"major_version": 9, "qx_version": {"major": 1}})"), core + "/qx_version",
        "needs core version 10.0"},
-      {withCore(R"({"qx_version": {"major": 16}})"), core + "/qx_version/major", "from 0 to 15"},
-      {withCore(R"({"qx_version": {"beta": 1}})"), core + "/qx_version/beta", "unknown key"},
       {withCore(R"({"clock": {"cycles_per_sequence": 1.5}})"), core + "/clock/cycles_per_sequence",
        "expected a number from 0 to 4294967295, found 1.5"},
       {withCore(R"({"async_inputs": 18446744073709551616})"), core + "/async_inputs",
@@ -88,7 +71,6 @@ TEST(Description, EveryProblemIsNamedByItsPointer) {
        "", "nested deeper than 32 levels"},
       {withCore(R"({"wiring": [{"input": ")" + std::string(40000, 'x') + "\"}]}"),
        core + "/wiring/0/input", "found \"xxxxxxxx"},
-      {withCore(R"({"wiring": {}})"), core + "/wiring", "expected an array"},
       {withCore(R"({"wiring": [{"source": {"kind": "constant"}}]})"), core + "/wiring/0/input",
        "missing; expected \"async\" or \"sync\""},
       {withCore(
@@ -122,20 +104,15 @@ TEST(Description, EveryProblemIsNamedByItsPointer) {
        "only MOX cores (type 9) have ports"},
       {withCore(R"({"type": 3, "status": "XYZ"})"), core + "/status", "hexadecimal digits"},
       {withCore(R"({"status": "01"})"), core + "/status", "built from its widths"},
-      {withCore(R"({"name": 5})"), core + "/name", "expected a text"},
   };
   for (const Case& c : cases) {
-    SCOPED_TRACE(c.json);
-    try {
-      ZinSim::parseDescription(c.json);
-      ADD_FAILURE() << "accepted";
-    } catch (const DescriptionError& e) {
-      EXPECT_EQ(e.pointer(), c.pointer) << e.what();
-      EXPECT_NE(e.problem().find(c.problem), std::string::npos) << e.what();
-      const std::string shown = c.pointer.empty() ? "(description)" : c.pointer;
-      EXPECT_EQ(std::string(e.what()).rfind(shown + ": ", 0), 0u) << e.what();
-      EXPECT_LT(e.problem().size(), 200u);
-    }
+    const auto e = errorOf([&] { ZinSim::parseDescription(c.json); });
+    ASSERT_TRUE(e) << "accepted " << c.json;
+    EXPECT_EQ(e->pointer(), c.pointer) << e->what();
+    EXPECT_NE(e->problem().find(c.problem), std::string::npos) << e->what();
+    const std::string shown = c.pointer.empty() ? "(description)" : c.pointer;
+    EXPECT_EQ(std::string(e->what()).rfind(shown + ": ", 0), 0u) << e->what();
+    EXPECT_LT(e->problem().size(), 200u);
   }
 }
 
@@ -145,25 +122,18 @@ TEST(Description, FilesAndDescriptionsBuiltInCode) {
     std::ofstream file(path);
     file << withCore(R"({"async_outputs": 70000})");
   }
-  try {
-    ZinSim::loadDescription(path);
-    ADD_FAILURE() << "accepted";
-  } catch (const DescriptionError& e) {
-    EXPECT_EQ(e.pointer(), "/devices/0/chains/0/cores/0/async_outputs");
-    EXPECT_NE(std::string(e.what()).find(path), std::string::npos) << e.what();
-  }
-  EXPECT_THROW(ZinSim::loadDescription(path + ".missing"), DescriptionError);
-
+  auto e = errorOf([&] { ZinSim::loadDescription(path); });
+  ASSERT_TRUE(e);
+  EXPECT_EQ(e->pointer(), "/devices/0/chains/0/cores/0/async_outputs");
+  EXPECT_NE(std::string(e->what()).find(path), std::string::npos) << e->what();
+  EXPECT_TRUE(errorOf([&] { ZinSim::loadDescription(path + ".missing"); }));
   ZinSim::TargetDescription twice;
   twice.cores = {ZinSimTest::moxCore({0, 1, 2}, 1, 1, 1, 1),
                  ZinSimTest::moxCore({0, 1, 2}, 1, 1, 1, 1)};
-  try {
-    ZinSim::Target target(twice);
-    ADD_FAILURE() << "accepted";
-  } catch (const DescriptionError& e) {
-    EXPECT_EQ(e.pointer(), "/cores/1");
-    EXPECT_EQ(e.problem(), "device 00 chain 1 core 2 is described twice");
-  }
+  e = errorOf([&] { ZinSim::Target target(twice); });
+  ASSERT_TRUE(e);
+  EXPECT_EQ(e->pointer(), "/cores/1");
+  EXPECT_EQ(e->problem(), "device 00 chain 1 core 2 is described twice");
   ZinSim::TargetDescription wide;
   wide.cores = {ZinSimTest::moxCore({0, 0, 16}, 1, 1, 1, 1)};
   EXPECT_THROW(ZinSim::Target{wide}, DescriptionError);
@@ -172,9 +142,6 @@ TEST(Description, FilesAndDescriptionsBuiltInCode) {
 TEST(Description, DemoDesignHasEveryLayoutAndAnotherType) {
   const ZinSim::TargetDescription demo = ZinSim::demoDescription();
   ASSERT_EQ(demo.cores.size(), 4u);
-  EXPECT_EQ(nlohmann::json::parse(ZinSim::demoDescriptionJson())["devices"][0]["chains"][0]["cores"]
-                .size(),
-            4u);
   ZinSim::Target target;
   std::vector<ZIN_CORE_REF> refs;
   target.listCores(refs);
@@ -194,30 +161,38 @@ TEST(Description, DemoDesignHasEveryLayoutAndAnotherType) {
   EXPECT_EQ(target.asyncInputLevels(full), std::string(16, '0'));
 }
 
-}  // namespace
-
-namespace {
-
-TEST(Description, WrittenDescriptionsReadBackTheSame) {
-  ZinSim::TargetDescription d = ZinSim::demoDescription();
-  d.cores.push_back(ZinSimTest::moxCore({7, 3, 2}, 3, 2, 1, 1));
-  d.cores.back().wiring = {{ZinSim::InputPort::Sync, 1, 1, ZinSim::InputSource::square(9, 4)},
-                           {ZinSim::InputPort::Async, 0, 3, ZinSim::InputSource::constant(true)}};
-  d.cores.back().cyclesPerSequence = 0;
+// Every field of a core is read and written; the demo design and that core come back the same.
+TEST(Description, ReadsEveryFieldAndWritesWhatItReads) {
+  ZinSim::TargetDescription d = ZinSim::parseDescription(withCore(R"({
+      "index": 7, "name": "probe", "manufacturer_id": "0x1A5", "type": 9,
+      "major_version": 10, "minor_version": 3, "revision": 4,
+      "qx_version": {"major": 2, "minor": 17, "alpha": 1},
+      "async_inputs": 5, "sync_inputs": 6, "async_outputs": 3, "sync_outputs": 2,
+      "clock": {"cycles_per_sequence": 0},
+      "wiring": [{"input": "sync", "first": 4, "count": 2,
+                  "source": {"kind": "square", "period": 10, "phase": 3}},
+                 {"input": "async", "count": 3, "source": {"kind": "constant", "value": 1}}]})"));
+  const ZinSim::TargetDescription demo = ZinSim::demoDescription();
+  d.cores.insert(d.cores.begin(), demo.cores.begin(), demo.cores.end());
   std::swap(d.cores.front(), d.cores.back());  // the writer orders the cores by reference
-  const ZinSim::TargetDescription again =
-      ZinSim::parseDescription(ZinSim::descriptionToJson(d, -1));
+  const std::string text = ZinSim::descriptionToJson(d, -1);
+  const ZinSim::TargetDescription again = ZinSim::descriptionFromJson(nlohmann::json::parse(text));
   // Written a second time, the text is the same: nothing was lost or reordered on the way.
-  EXPECT_EQ(ZinSim::descriptionToJson(again), ZinSim::descriptionToJson(d));
+  EXPECT_EQ(ZinSim::descriptionToJson(again, -1), text);
   ASSERT_EQ(again.cores.size(), 5u);
   EXPECT_EQ(again.cores[3].status, (std::vector<unsigned char>{0xEE, 0xFF, 0xC0, 0x00}));
-  const ZinSim::CoreDescription& last = again.cores[4];
-  EXPECT_EQ(last.ref.deviceIndex, 7u);
-  ASSERT_EQ(last.wiring.size(), 2u);
-  EXPECT_EQ(last.wiring[0].source.period, 9u);
-  EXPECT_EQ(last.wiring[0].source.phase, 4u);
-  EXPECT_EQ(last.wiring[1].count, 3u);
-  EXPECT_EQ(last.cyclesPerSequence, 0u);
+  const ZinSim::CoreDescription& c = again.cores[4];  // read, written and read again
+  EXPECT_EQ(c.ref.deviceIndex, 1u);
+  EXPECT_EQ(c.ref.userChainNumber, 2u);
+  EXPECT_EQ(c.ref.coreIndex, 7u);
+  EXPECT_EQ(c.manufacturerId, 0x1A5u);
+  EXPECT_EQ(c.qxMinorVersion, 17u);
+  EXPECT_EQ(c.syncInputs, 6u);
+  EXPECT_EQ(c.cyclesPerSequence, 0u);
+  ASSERT_EQ(c.wiring.size(), 2u);
+  EXPECT_EQ(c.wiring[0].source.kind, ZinSim::InputSource::Kind::Square);
+  EXPECT_EQ(c.wiring[0].source.phase, 3u);
+  EXPECT_EQ(c.wiring[1].count, 3u);
 }
 
 }  // namespace

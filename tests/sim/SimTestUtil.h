@@ -47,29 +47,21 @@ inline ZinTest::InputImage readInputs(ZinSim::Target& target, const std::string&
   const uint32_t r = ZinTest::readBitCount(asyncIn, syncIn);
   std::vector<unsigned char> data(r / 8, 0);
   target.commandSequence(ZinTest::readCommandText(prefix, asyncIn, syncIn), data.data(), r);
-  const uint64_t n = 4ull * asyncIn + 6ull * syncIn;
-  auto bit = [&](uint64_t j) {  // B[j] is bit n-1-j of the little-endian number
-    const uint64_t b = n - 1 - j;
-    return ((data[b / 8] >> (b % 8)) & 1) ? '1' : '0';
-  };
+  const size_t n = 4ull * asyncIn + 6ull * syncIn;
+  const std::string all = ZinTest::unpackBits(data.data(), r);
+  EXPECT_EQ(all.find('1', n), std::string::npos) << "a read bit above the input image";
+  const std::string b(all.rend() - static_cast<long>(n), all.rend());  // B[j] is bit n-1-j
   ZinTest::InputImage image = ZinTest::InputImage::zeros(asyncIn, syncIn);
-  for (uint64_t i = 0; i < asyncIn; ++i) {
-    image.asyncValue[i] = bit(4 * i);
-    image.asyncUp[i] = bit(4 * i + 1);
-    image.asyncDown[i] = bit(4 * i + 2);
-    EXPECT_EQ(bit(4 * i + 3), '0') << "unused bit of async input " << i;
+  std::string* const places[] = {&image.asyncValue, &image.asyncUp,     &image.asyncDown,
+                                 &image.syncValue,  &image.syncUp,      &image.syncDown,
+                                 &image.syncSyncUp, &image.syncSyncDown};
+  for (size_t i = 0; i < asyncIn; ++i) {
+    for (size_t f = 0; f < 3; ++f) (*places[f])[i] = b[4 * i + f];
+    EXPECT_EQ(b[4 * i + 3], '0') << "unused bit of async input " << i;
   }
-  for (uint64_t i = 0; i < syncIn; ++i) {
-    const uint64_t base = 4ull * asyncIn + 6 * i;
-    image.syncValue[i] = bit(base);
-    image.syncUp[i] = bit(base + 1);
-    image.syncDown[i] = bit(base + 2);
-    image.syncSyncUp[i] = bit(base + 3);
-    image.syncSyncDown[i] = bit(base + 4);
-    EXPECT_EQ(bit(base + 5), '0') << "unused bit of sync input " << i;
-  }
-  for (uint64_t b = n; b < 8ull * data.size(); ++b) {
-    EXPECT_EQ((data[b / 8] >> (b % 8)) & 1, 0) << "read bit " << b << " above the input image";
+  for (size_t i = 0, base = 4ull * asyncIn; i < syncIn; ++i, base += 6) {
+    for (size_t f = 0; f < 5; ++f) (*places[3 + f])[i] = b[base + f];
+    EXPECT_EQ(b[base + 5], '0') << "unused bit of sync input " << i;
   }
   return image;
 }

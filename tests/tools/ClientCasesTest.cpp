@@ -9,8 +9,8 @@
 
 namespace {
 
+using namespace zinmox_test;
 using nlohmann::json;
-using zinmox_test::runTool;
 
 json cases(const char* group) {
   std::ifstream file(ZINMOX_CLIENT_CASES);
@@ -60,7 +60,7 @@ TEST(ClientCases, Values) {
   }
 }
 
-TEST(ClientCases, BitListsAndNames) {
+TEST(ClientCases, BitListsNamesAndTargets) {
   for (const json& entry : cases("bits")) {
     const auto result = runTool({"define", "0:1:0", "x", "async_out", entry.at("text")});
     expectOutcome(entry, result);
@@ -71,6 +71,9 @@ TEST(ClientCases, BitListsAndNames) {
   }
   for (const json& entry : cases("names")) {
     expectOutcome(entry, runTool({"define", "0:1:0", entry.at("text"), "async_out", "0"}));
+  }
+  for (const json& entry : cases("targets")) {
+    expectOutcome(entry, runTool({"--target", entry.at("text"), "scan"}));
   }
 }
 

@@ -1,11 +1,9 @@
-// The host library's texts: references, bit lists, hex vectors, names, targets and the signals
-// document. What both clients must agree on is in client_cases.json (ClientCasesTest.cpp).
+// The host library's bit lists and hex vectors below what the clients show. What both clients
+// must agree on is in client_cases.json (ClientCasesTest.cpp); the signals document's errors are
+// the tool's (ErrorPathTest.cpp).
 #include <gtest/gtest.h>
 
 #include "ZinHost/BitList.h"
-#include "ZinHost/Signals.h"
-#include "ZinHost/SignalsFile.h"
-#include "ZinHost/Target.h"
 #include "ZinHost/TextError.h"
 #include "ZinHost/ValueText.h"
 
@@ -51,44 +49,6 @@ TEST(HostText, HexVectorsRoundTripAndNeverCutBits) {
   // The library's fitting: sign-extended when short, the last digits when long.
   EXPECT_EQ(fitHexDigits("8", 2), (std::vector<uint8_t>{0xF8, 0xFF}));
   EXPECT_EQ(fitHexDigits("12345", 2), (std::vector<uint8_t>{0x45, 0x23}));
-}
-
-TEST(HostText, Targets) {
-  EXPECT_EQ(describeTarget(""), "the built-in demo design");
-  EXPECT_EQ(describeTarget("tcp://127.0.0.1:7700"), "the target server at 127.0.0.1:7700");
-  EXPECT_EQ(describeTarget("tls://[::1]:7700"), "the target server at [::1]:7700 (TLS)");
-  EXPECT_EQ(describeTarget("openocd://127.0.0.1:6666?board=ecp5"), "OpenOCD at 127.0.0.1:6666");
-  for (const char* text : {"tcp://nohost", "openocd://127.0.0.1", "x://y"}) {
-    try {
-      openTarget(text);
-      FAIL() << text;
-    } catch (const TargetError& error) {
-      EXPECT_EQ(error.kind(), TargetError::Kind::Malformed) << text;
-    }
-  }
-  const OpenedTarget demo = openTarget("");
-  EXPECT_TRUE(demo.simulated != nullptr && demo.transport == demo.simulated);
-}
-
-TEST(HostText, SignalsDocument) {
-  const auto signals = parseSignals(
-      R"({"signals": [{"name": "a", "port": "sync_in", "bits": [5, 1]},
-                      {"name": "A", "port": "async_out", "bits": "2-0"}]})",
-      "test");
-  ASSERT_EQ(signals.size(), 2u);
-  EXPECT_EQ(signals[0].port, Port::SyncIn);
-  EXPECT_EQ(signals[0].bits, (std::vector<uint32_t>{5, 1}));
-  EXPECT_EQ(signals[1].port, Port::AsyncOut);  // an input and an output may share a name
-  EXPECT_EQ(signals[1].bits, (std::vector<uint32_t>{2, 1, 0}));
-  EXPECT_TRUE(parseSignals(R"({"signals": []})", "test").empty());
-  ZINMOX_CORE_INFO narrow{};
-  narrow.async_output_count = 2;
-  for (const char* bad : {R"({"signals": [{"name": "a", "port": "sync_in", "bits": [65536]}]})",
-                          R"({"signals": [{"name": "a", "port": "sync_in", "bits": [1, 1]}]})",
-                          R"({"signals": [{"name": "a.b", "port": "sync_out", "bits": "0"}]})",
-                          R"({"signals": [{"name": "a", "port": "async_out", "bits": "0-2"}]})"}) {
-    EXPECT_THROW(parseSignals(bad, "test", &narrow), SignalsFileError) << bad;
-  }
 }
 
 }  // namespace

@@ -1,4 +1,5 @@
-// --json output parsed back and compared with the target and with the table output.
+// The tool's output on the demo design: --json parsed back and compared with the design and the
+// table output, and the guided tour with its loopback and the counter seen by watch.
 #include <gtest/gtest.h>
 
 #include "ToolOutput.h"
@@ -6,9 +7,8 @@
 
 namespace {
 
+using namespace zinmox_test;
 using nlohmann::json;
-using zinmox_test::jsonDocuments;
-using zinmox_test::runTool;
 
 TEST(JsonOutput, ScanAndInfoMatchTheDemoDesign) {
   const auto scan = runTool({"scan", "--json"});
@@ -90,6 +90,53 @@ TEST(JsonOutput, ReadsShowTheLoopbackOfWrites) {
   EXPECT_EQ(ports["async_in"]["activity_down"], "04");
   EXPECT_EQ(ports["sync_in"]["value"], "3");
   EXPECT_FALSE(ports["async_in"].contains("sync_activity_up"));
+}
+
+// Rows of a read table or of watch: the second field is a number (the tour's explanations may
+// start with a signal name too).
+std::vector<std::vector<std::string>> numberRows(const std::string& text,
+                                                 const std::string& first) {
+  auto rows = rowsStartingWith(text, first);
+  std::erase_if(rows, [](const auto& row) {
+    return row.size() < 3 || row[1].find_first_not_of("0123456789") != std::string::npos;
+  });
+  return rows;
+}
+
+// The guided tour: scan rows, the loopback of a value and of a pulse train, and the counter
+// advancing by one cycle per transfer, also as watch shows it (a changed value is marked).
+TEST(Demo, ShowsTheDemoDesignAndItsLoopback) {
+  const auto result = runTool({"demo"});
+  ASSERT_EQ(result.status, 0) << result.err;
+  EXPECT_EQ(result.err, "");
+  for (const char* ref : {"0:1:0", "0:1:1", "0:1:2", "0:1:3"}) {
+    EXPECT_EQ(rowsStartingWith(result.out, ref).size(), 1u) << ref;
+  }
+  EXPECT_EQ(rowsStartingWith(result.out, "sync_input_count").at(0).at(1), "12");
+  // Two reads: the written value loops back with its rising activity once; the one-step pulse
+  // train rises in the first read and falls in the second.
+  using Rows = std::vector<std::vector<std::string>>;
+  EXPECT_EQ(numberRows(result.out, "leds_in"),
+            (Rows{{"leds_in", "8", "A5", "A5", "00", "-", "-"},
+                  {"leds_in", "8", "A5", "00", "00", "-", "-"}}));
+  EXPECT_EQ(numberRows(result.out, "strobe_in"),
+            (Rows{{"strobe_in", "1", "1", "1", "0", "1", "0"},
+                  {"strobe_in", "1", "0", "0", "1", "0", "1"}}));
+  Rows counts = numberRows(result.out, "count");  // two reads, then watch reads 1 to 4
+  ASSERT_EQ(counts.size(), 2u);
+  for (const char* read : {"1", "2", "3", "4"}) {
+    const Rows rows = numberRows(result.out, read);
+    ASSERT_FALSE(rows.empty()) << "watch read " << read;
+    counts.push_back(rows.back());
+  }
+  for (size_t i = 1; i < counts.size(); ++i) {
+    EXPECT_EQ(std::stoi(counts[i].at(2), nullptr, 16),
+              (std::stoi(counts[i - 1].at(2), nullptr, 16) + 1) % 16)
+        << "read " << i;
+    if (i >= 3) {
+      EXPECT_NE(counts[i].at(3).find('*'), std::string::npos) << "read " << i;
+    }
+  }
 }
 
 }  // namespace
