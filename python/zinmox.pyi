@@ -126,10 +126,18 @@ class SimTarget:
 
 class Session:
     """A JTAG session. target: None for the simulated demo design, the path of a target
-    description file, or a dict in the description format. A context manager that closes the
-    session."""
+    description file, "tcp://HOST:PORT" or "tls://HOST:PORT" of a target server, or a dict in
+    the description format. token: the token the server requires (default: ZINMOX_TOKEN);
+    tls_ca: PEM file of the certificate authorities for tls://. A context manager that closes
+    the session."""
 
-    def __init__(self, target: None | str | os.PathLike[str] | dict[str, Any] = None) -> None: ...
+    def __init__(
+        self,
+        target: None | str | os.PathLike[str] | dict[str, Any] = None,
+        *,
+        token: str = "",
+        tls_ca: str = "",
+    ) -> None: ...
     def close(self) -> None: ...
     @property
     def closed(self) -> bool: ...

@@ -1,10 +1,11 @@
 #!/usr/bin/env bash
 # Installs, from Debian packages, whatever the build and the tests need and the machine lacks
-# (help2man writes the tool's manual page, dpkg-dev makes and checks the Debian packages).
+# (help2man writes the tool's manual page, dpkg-dev makes and checks the Debian packages, the
+# openssl command makes the TLS tests' throwaway certificate).
 set -euo pipefail
 packages=(cmake g++ make pkg-config googletest libgtest-dev libgmock-dev libbenchmark-dev
   libcli11-dev nlohmann-json3-dev libasio-dev python3 python3-dev python3-pybind11 pybind11-dev
-  python3-pytest clang-format help2man dpkg-dev libcpp-httplib-dev
+  python3-pytest clang-format help2man dpkg-dev libcpp-httplib-dev libssl-dev openssl
   chromium chromium-driver python3-selenium gtkwave
   verilator yosys nextpnr-ice40 fpga-icestorm openocd)
 # The libFuzzer targets (scripts/fuzz.sh) also need clang and its fuzzing runtime.

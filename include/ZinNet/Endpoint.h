@@ -1,4 +1,5 @@
-// Network endpoints as users write them: "HOST:PORT", "[v6-address]:PORT" and "tcp://HOST:PORT".
+// Network endpoints as users write them: "HOST:PORT", "[v6-address]:PORT", "tcp://HOST:PORT" and
+// "tls://HOST:PORT".
 #ifndef ZINNET_ENDPOINT_H
 #define ZINNET_ENDPOINT_H
 
@@ -27,6 +28,9 @@ ZINNET_API Endpoint parseEndpoint(std::string_view text, bool allowAnyPort = fal
 /// Reads a target text: nothing when it does not start with "tcp://", else the endpoint after it
 /// (port 0 is refused). Throws std::invalid_argument for a malformed "tcp://" text.
 ZINNET_API std::optional<Endpoint> parseTcpTarget(std::string_view target);
+
+/// The same for "tls://": a target server reached over TLS.
+ZINNET_API std::optional<Endpoint> parseTlsTarget(std::string_view target);
 
 }  // namespace ZinNet
 

@@ -18,6 +18,9 @@ inline constexpr uint32_t kLengthBytes = 4;
 inline constexpr uint32_t kMaxStatusBytes = 256;
 /// Error texts longer than this are cut.
 inline constexpr uint32_t kMaxErrorText = 4096;
+/// Bytes of each nonce and of each HMAC-SHA256 of the token exchange.
+inline constexpr uint32_t kNonceBytes = 32;
+inline constexpr uint32_t kMacBytes = 32;
 
 /// The first byte of every frame.
 enum class MessageType : uint8_t {
@@ -29,16 +32,20 @@ enum class MessageType : uint8_t {
   ListCores = 0x05,         // empty
   SequenceAndFlush = 0x06,  // version 2: as CommandSequence, then a flush; answered by ReadData
   Ping = 0x07,              // version 2: empty; answered by Pong without touching the target
+  TokenRequest = 0x10,      // 32-byte client nonce: asks for a token challenge
+  TokenProof = 0x11,        // 32-byte HMAC-SHA256 proving the client knows the token
   // Server to client.
-  Welcome = 0x81,       // magic, u16 version, u32 max frame bytes, u32 max read bytes, name text
-  Status = 0x82,        // 5 x u32 core information, then the status bytes
-  ReadData = 0x83,      // the read data bytes
-  Flushed = 0x84,       // empty
-  Cores = 0x85,         // u8 supported, u32 count, count x (u32 device, chain, core)
-  Pong = 0x87,          // empty
-  TargetFailed = 0xE0,  // text: the target refused or failed the request; connection stays
-  Refused = 0xE1,       // text: the request was malformed; connection stays
-  Closing = 0xE2        // text: the server closes the connection after this frame
+  Welcome = 0x81,         // magic, u16 version, u32 max frame bytes, u32 max read bytes, name text
+  Status = 0x82,          // 5 x u32 core information, then the status bytes
+  ReadData = 0x83,        // the read data bytes
+  Flushed = 0x84,         // empty
+  Cores = 0x85,           // u8 supported, u32 count, count x (u32 device, chain, core)
+  Pong = 0x87,            // empty
+  TokenChallenge = 0x90,  // 32-byte server nonce, 32-byte HMAC-SHA256 proving the server's token
+  TokenAccepted = 0x91,   // empty: requests may follow
+  TargetFailed = 0xE0,    // text: the target refused or failed the request; connection stays
+  Refused = 0xE1,         // text: the request was malformed; connection stays
+  Closing = 0xE2          // text: the server closes the connection after this frame
 };
 
 }  // namespace ZinNet::Protocol

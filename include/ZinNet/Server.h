@@ -13,7 +13,8 @@
 namespace ZinNet {
 
 struct ServerOptions {
-  /// Address to listen on. Only loopback unless told otherwise.
+  /// Address to listen on. Only loopback unless told otherwise. Any other address needs a token,
+  /// or `insecure`.
   std::string host = "127.0.0.1";
   /// 0 takes a free port (see Server::port()).
   uint16_t port = 0;
@@ -25,7 +26,8 @@ struct ServerOptions {
   uint32_t frameTimeoutMs = 10000;
   /// A reply must be taken by the client within this time.
   uint32_t writeTimeoutMs = 10000;
-  /// A new connection must have sent its hello within this time (0: no limit).
+  /// A new connection must have done its TLS handshake, its hello and its token proof within
+  /// this time (0: no limit).
   uint32_t greetingTimeoutMs = 5000;
   /// A connection that sends no frame for this long after its last reply is closed (0: never).
   uint32_t idleTimeoutMs = 60000;
@@ -40,6 +42,16 @@ struct ServerOptions {
   std::function<void(const std::string&)> log;
   /// Stop the server on SIGINT and SIGTERM.
   bool stopOnSignals = false;
+  /// When not empty, every client must prove that it knows this token (an HMAC-SHA256 challenge
+  /// and response, see docs/protocol.md) before any request is served. ZinNet::checkToken's
+  /// limits apply.
+  std::string token;
+  /// Allows an address other than loopback without a token: whoever reaches the port drives the
+  /// target. Without it, start() refuses such an address.
+  bool insecure = false;
+  /// Both set: clients must speak TLS; the certificate chain and its private key, PEM files.
+  std::string tlsCertFile;
+  std::string tlsKeyFile;
 };
 
 /// What a server has done so far.
@@ -48,6 +60,7 @@ struct ServerStats {
   uint64_t connectionsOpen = 0;
   uint64_t requestsServed = 0;  // requests carried out on the transport
   uint64_t framesRefused = 0;   // malformed, oversized, truncated or timed-out frames
+  uint64_t tokensRefused = 0;   // connections closed for a missing or wrong token proof
 };
 
 /// Serves `transport` to any number of clients. Each request is carried out whole and alone on
@@ -66,7 +79,8 @@ class ZINNET_API Server {
   Server& operator=(const Server&) = delete;
 
   /// Binds, listens and serves on background threads. Throws std::runtime_error when the address
-  /// cannot be bound, std::logic_error when started twice.
+  /// cannot be bound, is not loopback while there is no token and `insecure` is false, or the
+  /// token or the TLS files are unusable; std::logic_error when started twice.
   void start();
   /// Closes the listener and every connection; a request in progress finishes first. Idempotent.
   void stop();

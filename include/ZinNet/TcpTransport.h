@@ -30,11 +30,19 @@ class ZINNET_API TargetError : public std::runtime_error {
 };
 
 struct ClientOptions {
-  uint32_t connectTimeoutMs = 3000;   // resolution, connect and greeting together
+  uint32_t connectTimeoutMs = 3000;   // resolution, connect, TLS, greeting and token together
   uint32_t requestTimeoutMs = 10000;  // sending a request and receiving its whole answer
+  /// When not empty, the client proves that it knows this token, and the server must prove the
+  /// same; a server that asks for no token is then refused. ZinNet::checkToken's limits apply.
+  std::string token{};
+  /// Speak TLS, and check that the server's certificate is valid for its host name.
+  bool tls = false;
+  /// PEM file of the certificate authorities to trust for TLS; empty: the system's.
+  std::string tlsCaFile{};
 };
 
-/// Reaches the target of a server started with `zinmox serve` or ZinNet::Server.
+/// Reaches the target of a server started with `zinmox serve` or ZinNet::Server, with TLS and a
+/// token when the options ask for them.
 ///
 ///   auto transport = std::make_shared<ZinNet::TcpTransport>("127.0.0.1", 5555);
 ///   transport->connect();                        // optional: report a missing server now

@@ -20,7 +20,23 @@ extern "C" {
    later fails the call in progress, and the session's next call connects again. */
 ZINNET_API uint32_t ZinNet_openSession(const char* host, uint16_t port, uint32_t timeoutMs);
 
-/* The text of the calling thread's last ZinNet_openSession failure ("" after a success). The
+/* How to reach a target server beyond ZinNet_openSession's host, port and timeout. Set every
+   field (zero-initialise the struct, then fill in what you need). */
+typedef struct ZinNet_SessionOptions {
+  const char* host;      /* the server's host name or address */
+  uint16_t port;         /* its port */
+  uint32_t timeoutMs;    /* as for ZinNet_openSession; 0 takes the defaults */
+  const char* token;     /* NULL or "": no token; else the token both sides prove they know */
+  int tls;               /* nonzero: speak TLS and check the server's certificate and host name */
+  const char* tlsCaFile; /* NULL or "": the system's certificate authorities; else a PEM file */
+} ZinNet_SessionOptions;
+
+/* ZinNet_openSession with the options above (a token, TLS). Returns the session handle, or 0
+   with ZinNet_lastError telling why (a null `options` too). */
+ZINNET_API uint32_t ZinNet_openSessionWith(const ZinNet_SessionOptions* options);
+
+/* The text of the calling thread's last ZinNet_openSession or ZinNet_openSessionWith failure
+   ("" after a success). The
    text stays valid until the thread's next ZinNet_openSession call. */
 ZINNET_API const char* ZinNet_lastError(void);
 

@@ -67,14 +67,16 @@ void bindSession(py::module_& module) {
       module, "Session",
       "A JTAG session on a target.\n\n"
       "target: None for the built-in simulated demo design, the path of a target description "
-      "file, \"tcp://HOST:PORT\" of a target server (zinmox serve), \"openocd://HOST:PORT\" of "
-      "OpenOCD's Tcl port, or a dict in the description "
-      "format. A context manager: leaving the with block "
-      "closes the session.")
-      .def(py::init([](const py::object& target) {
-             return std::make_shared<SessionState>(makeTransport(target));
-           }),
-           arg("target") = py::none())
+      "file, \"tcp://HOST:PORT\" of a target server (zinmox serve), \"tls://HOST:PORT\" of one "
+      "that speaks TLS, \"openocd://HOST:PORT\" of OpenOCD's Tcl port, or a dict in the "
+      "description format. token: the token a target server requires (default: the ZINMOX_TOKEN "
+      "variable when set); tls_ca: PEM file of the certificate authorities for tls:// (default: "
+      "the system's). A context manager: leaving the with block closes the session.")
+      .def(py::init(
+               [](const py::object& target, const std::string& token, const std::string& tlsCa) {
+                 return std::make_shared<SessionState>(makeTransport(target, {token, tlsCa}));
+               }),
+           arg("target") = py::none(), py::kw_only(), arg("token") = "", arg("tls_ca") = "")
       .def("close", &SessionState::close,
            "Closes the session; the cores initialised on it are dropped. Closing twice does "
            "nothing. Later calls on the session or its cores raise zinmox.Error.")

@@ -20,13 +20,13 @@ TransportChoice fromDict(const py::dict& target) {
 
 }  // namespace
 
-TransportChoice makeTransport(const py::object& target) {
+TransportChoice makeTransport(const py::object& target, const ZinHost::ServerAccess& access) {
   if (target.is_none()) return ZinHost::openTarget("");
   if (py::isinstance<py::dict>(target)) return fromDict(target);
   const py::object pathLike = py::module_::import("os").attr("PathLike");
   if (py::isinstance<py::str>(target) || py::isinstance(target, pathLike)) {
     const py::object text = py::module_::import("os").attr("fsdecode")(target);
-    return ZinHost::openTarget(text.cast<std::string>());
+    return ZinHost::openTarget(text.cast<std::string>(), access);
   }
   throw py::type_error("target must be None, a description file path or a description dict, not " +
                        std::string(py::str(target.get_type().attr("__name__"))));

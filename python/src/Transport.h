@@ -11,10 +11,12 @@ namespace zinmox {
 using TransportChoice = ZinHost::OpenedTarget;
 
 /// None: the built-in demo design; a str or path-like: a target text of the host library
-/// ("tcp://HOST:PORT" or a description file); a dict: a description in the description format.
-/// Raises TypeError for other types; ZinHost::TargetError becomes ValueError, or ConnectionError
-/// for a server that cannot be reached.
-TransportChoice makeTransport(const pybind11::object& target);
+/// ("tcp://HOST:PORT", "tls://HOST:PORT" or a description file); a dict: a description in the
+/// description format. Raises TypeError for other types; ZinHost::TargetError becomes ValueError,
+/// or ConnectionError for a server that cannot be reached. `access` holds the token and the CA file
+/// for a server.
+TransportChoice makeTransport(const pybind11::object& target,
+                              const ZinHost::ServerAccess& access = {});
 
 }  // namespace zinmox
 

@@ -8,6 +8,7 @@
 #include "ZinHub/OpenOcdTarget.h"
 #include "ZinNet/Endpoint.h"
 #include "ZinNet/TcpTransport.h"
+#include "ZinNet/Token.h"
 
 namespace ZinHost {
 
@@ -15,26 +16,44 @@ namespace {
 
 using Kind = TargetError::Kind;
 
-ZinNet::Endpoint tcpEndpoint(const std::string& text) {
+bool isTls(const std::string& text) {
+  return text.rfind("tls://", 0) == 0;
+}
+
+ZinNet::Endpoint serverEndpoint(const std::string& text) {
   try {
-    return *ZinNet::parseTcpTarget(text);
+    return isTls(text) ? *ZinNet::parseTlsTarget(text) : *ZinNet::parseTcpTarget(text);
   } catch (const std::invalid_argument& error) {
     throw TargetError(Kind::Malformed, error.what());
   }
 }
 
-std::string describeTcp(const std::string& text) {
-  return "the target server at " + tcpEndpoint(text).text();
+std::string describeServer(const std::string& text) {
+  return "the target server at " + serverEndpoint(text).text() + (isTls(text) ? " (TLS)" : "");
 }
 
-OpenedTarget openTcp(const std::string& text) {
-  auto transport = std::make_shared<ZinNet::TcpTransport>(tcpEndpoint(text));
+ZinNet::ClientOptions clientOptions(const std::string& text, const ServerAccess& access) {
+  ZinNet::ClientOptions options;
+  options.tls = isTls(text);
+  options.tlsCaFile = access.tlsCaFile;
+  try {
+    options.token = access.token.empty() ? ZinNet::tokenFromEnvironment() : access.token;
+    if (!options.token.empty()) ZinNet::checkToken(options.token, "the given token");
+  } catch (const std::invalid_argument& error) {
+    throw TargetError(Kind::Malformed, error.what());
+  }
+  return options;
+}
+
+OpenedTarget openServer(const std::string& text, const ServerAccess& access) {
+  auto transport =
+      std::make_shared<ZinNet::TcpTransport>(serverEndpoint(text), clientOptions(text, access));
   try {
     transport->connect();  // report a missing server before any work starts
   } catch (const ZinNet::NetError& error) {
     throw TargetError(Kind::Unreachable, error.what());
   }
-  return {transport, nullptr, describeTcp(text)};
+  return {transport, nullptr, describeServer(text)};
 }
 
 ZinHub::OpenOcdTarget openOcdTarget(const std::string& text) {
@@ -50,7 +69,7 @@ std::string describeOpenOcd(const std::string& text) {
 }
 
 // A board behind OpenOCD: connected and checked against the board description at once.
-OpenedTarget openOpenOcd(const std::string& text) {
+OpenedTarget openOpenOcd(const std::string& text, const ServerAccess&) {
   const ZinHub::OpenOcdTarget target = openOcdTarget(text);
   try {
     return {ZinHub::openOpenOcd(target), nullptr, describeOpenOcd(text)};
@@ -65,11 +84,12 @@ OpenedTarget openOpenOcd(const std::string& text) {
 struct Scheme {
   const char* prefix;
   std::string (*describe)(const std::string& text);
-  OpenedTarget (*open)(const std::string& text);
+  OpenedTarget (*open)(const std::string& text, const ServerAccess& access);
 };
 
 const Scheme kSchemes[] = {
-    {"tcp://", describeTcp, openTcp},
+    {"tcp://", describeServer, openServer},
+    {"tls://", describeServer, openServer},
     {"openocd://", describeOpenOcd, openOpenOcd},
 };
 
@@ -83,10 +103,11 @@ const Scheme* schemeOf(const std::string& text) {
   const bool named = colon != std::string::npos && colon > 0 &&
                      text.find_first_not_of("abcdefghijklmnopqrstuvwxyz0123456789+.-") == colon;
   if (named) {
-    throw TargetError(Kind::Malformed,
-                      "unknown target kind '" + text.substr(0, colon + 3) + "' in '" +
-                          quoteShort(text) +
-                          "' (use tcp://HOST:PORT, openocd://HOST:PORT or a description file)");
+    throw TargetError(
+        Kind::Malformed,
+        "unknown target kind '" + text.substr(0, colon + 3) + "' in '" + quoteShort(text) +
+            "' (use tcp://HOST:PORT, tls://HOST:PORT, openocd://HOST:PORT or a description "
+            "file)");
   }
   return nullptr;
 }
@@ -103,12 +124,12 @@ OpenedTarget openDescription(const ZinSim::TargetDescription& description,
   }
 }
 
-OpenedTarget openTarget(const std::string& text) {
+OpenedTarget openTarget(const std::string& text, const ServerAccess& access) {
   if (text.empty()) {
     auto target = std::make_shared<ZinSim::Target>();
     return {target, target, describeTarget(text)};
   }
-  if (const Scheme* scheme = schemeOf(text)) return scheme->open(text);
+  if (const Scheme* scheme = schemeOf(text)) return scheme->open(text, access);
   const std::string origin = "the target file " + text;
   try {
     auto target = std::make_shared<ZinSim::Target>(ZinSim::loadDescription(text));

@@ -1,4 +1,4 @@
-// The one place the networking library is included (standalone, header-only).
+// The one place the networking library is included (standalone, header-only), with its TLS layer.
 #ifndef ZINNET_SRC_ASIO_H
 #define ZINNET_SRC_ASIO_H
 
@@ -6,5 +6,6 @@
 #define ASIO_STANDALONE
 #endif
 #include <asio.hpp>
+#include <asio/ssl.hpp>
 
 #endif

@@ -16,29 +16,20 @@ constexpr uint32_t kMaxReplyBytes = 64u << 20;
 
 }  // namespace
 
-/// Completion of one operation, shared with its handler so that a handler running after a
-/// timeout touches nothing that is gone.
-struct ClientChannel::OpState {
-  bool done = false;
-  std::error_code ec;
-  size_t bytes = 0;
-  tcp::resolver::results_type results;
-};
-
 ClientChannel::ClientChannel(Endpoint endpoint, ClientOptions options)
-    : endpoint_(std::move(endpoint)), options_(options), resolver_(io_), socket_(io_) {}
+    : endpoint_(std::move(endpoint)), options_(options), resolver_(io_), stream_(io_) {}
 
 ClientChannel::~ClientChannel() {
   std::error_code ec;
   resolver_.cancel();
-  socket_.close(ec);
+  stream_.socket().close(ec);
 }
 
 void ClientChannel::disconnect() {
   std::error_code ec;
   resolver_.cancel();
-  socket_.shutdown(tcp::socket::shutdown_both, ec);
-  socket_.close(ec);
+  stream_.socket().shutdown(tcp::socket::shutdown_both, ec);
+  stream_.socket().close(ec);
   connected_ = false;
 }
 
@@ -66,14 +57,18 @@ void ClientChannel::ensureConnected() {
 
 bool ClientChannel::closedByPeer() {
   // An idle connection has nothing to read: anything else (end of stream, a reset, stray bytes)
-  // means it cannot carry a request any more.
+  // means it cannot carry a request any more. Under TLS, bytes may be the layer's own records
+  // (session tickets), so only the end of the stream counts there, and nothing is taken.
+  tcp::socket& socket = stream_.socket();
   std::error_code ec;
-  socket_.non_blocking(true, ec);
+  socket.non_blocking(true, ec);
   if (ec) return true;
   unsigned char byte = 0;
-  socket_.read_some(asio::buffer(&byte, 1), ec);
+  const size_t n =
+      socket.receive(asio::buffer(&byte, 1), stream_.secure() ? tcp::socket::message_peek : 0, ec);
   std::error_code ignored;
-  socket_.non_blocking(false, ignored);
+  socket.non_blocking(false, ignored);
+  if (stream_.secure() && !ec && n == 1) return false;
   return ec != asio::error::would_block && ec != asio::error::try_again;
 }
 
@@ -96,17 +91,20 @@ void ClientChannel::connectNow() {
   // frame ("protocol version 2 is not supported; ..."), and is greeted again with the oldest.
   for (uint16_t version = Protocol::kVersion;; version = Protocol::kOldestVersion) {
     auto connected = std::make_shared<OpState>();
-    asio::async_connect(socket_, resolved->results, [connected](std::error_code ec, tcp::endpoint) {
-      connected->done = true;
-      connected->ec = ec;
-    });
+    stream_.reset();
+    asio::async_connect(stream_.socket(), resolved->results,
+                        [connected](std::error_code ec, tcp::endpoint) {
+                          connected->done = true;
+                          connected->ec = ec;
+                        });
     await(connected, deadline, what, ms);
     if (connected->ec) {
       fail("ZinNet: cannot connect to " + endpoint_.text() + ": " + connected->ec.message() +
            " (is `zinmox serve` running there?)");
     }
     std::error_code ec;
-    socket_.set_option(tcp::no_delay(true), ec);
+    stream_.socket().set_option(tcp::no_delay(true), ec);
+    if (options_.tls) startTls(deadline);
     if (greet(deadline, version)) break;
     disconnect();
   }
@@ -118,7 +116,17 @@ bool ClientChannel::greet(Clock::time_point deadline, uint16_t version) {
   const std::string what = "greeting " + endpoint_.text();
   FrameWriter hello(MessageType::Hello);
   hello.bytes(Protocol::kMagic, 4).u16(version);
-  writeAll(hello.finish(), deadline, what, ms);
+  std::vector<unsigned char> bytes = hello.finish();
+  // The token request goes with the hello: the challenge comes back with the welcome.
+  Nonce clientNonce{};
+  if (!options_.token.empty()) {
+    clientNonce = freshNonce();
+    const auto request = FrameWriter(MessageType::TokenRequest)
+                             .bytes(clientNonce.data(), clientNonce.size())
+                             .finish();
+    bytes.insert(bytes.end(), request.begin(), request.end());
+  }
+  writeAll(bytes, deadline, what, ms);
   const Frame reply = readFrame(deadline, what, ms);
   if (reply.type == MessageType::Closing) {
     const std::string text(reply.body.begin(), reply.body.end());
@@ -145,13 +153,14 @@ bool ClientChannel::greet(Clock::time_point deadline, uint16_t version) {
   } catch (const FrameError&) {
     fail("ZinNet: " + endpoint_.text() + " is not a ZinNet target server");
   }
+  if (!options_.token.empty()) proveToken(clientNonce, deadline);
   return true;
 }
 
 void ClientChannel::writeAll(const std::vector<unsigned char>& bytes, Clock::time_point deadline,
                              const std::string& what, uint32_t timeoutMs) {
   auto state = std::make_shared<OpState>();
-  asio::async_write(socket_, asio::buffer(bytes), [state](std::error_code ec, size_t n) {
+  asio::async_write(stream_, asio::buffer(bytes), [state](std::error_code ec, size_t n) {
     state->done = true;
     state->ec = ec;
     state->bytes = n;
@@ -168,7 +177,7 @@ Frame ClientChannel::readFrame(Clock::time_point deadline, const std::string& wh
   auto buffer = std::make_shared<std::vector<unsigned char>>(Protocol::kLengthBytes);
   for (int part = 0; part < 2; ++part) {
     auto state = std::make_shared<OpState>();
-    asio::async_read(socket_, asio::buffer(*buffer), [state, buffer](std::error_code ec, size_t n) {
+    asio::async_read(stream_, asio::buffer(*buffer), [state, buffer](std::error_code ec, size_t n) {
       state->done = true;
       state->ec = ec;
       state->bytes = n;

@@ -3,6 +3,7 @@
 #ifndef ZINNET_SRC_CLIENTCHANNEL_H
 #define ZINNET_SRC_CLIENTCHANNEL_H
 
+#include <array>
 #include <chrono>
 #include <cstdint>
 #include <memory>
@@ -11,6 +12,8 @@
 
 #include "Asio.h"
 #include "Frame.h"
+#include "NetStream.h"
+#include "TokenProof.h"
 #include "ZinNet/Endpoint.h"
 #include "ZinNet/TcpTransport.h"
 
@@ -42,11 +45,20 @@ class ClientChannel {
 
  private:
   using Clock = std::chrono::steady_clock;
-  struct OpState;
+  /// Completion of one operation, shared with its handler so that a handler running after a
+  /// timeout touches nothing that is gone.
+  struct OpState {
+    bool done = false;
+    std::error_code ec;
+    size_t bytes = 0;
+    asio::ip::tcp::resolver::results_type results;
+  };
 
   void connectNow();
+  void startTls(Clock::time_point deadline);
   /// False when the server refused `version` and an older one is left to try.
   bool greet(Clock::time_point deadline, uint16_t version);
+  void proveToken(const Nonce& clientNonce, Clock::time_point deadline);
   bool closedByPeer();
   void await(const std::shared_ptr<OpState>& state, Clock::time_point deadline,
              const std::string& what, uint32_t timeoutMs);
@@ -59,7 +71,8 @@ class ClientChannel {
   ClientOptions options_;
   asio::io_context io_;
   asio::ip::tcp::resolver resolver_;
-  asio::ip::tcp::socket socket_;
+  std::unique_ptr<asio::ssl::context> tls_;  // made on the first TLS connection
+  NetStream stream_;                         // after the context: its TLS layer uses it
   bool connected_ = false;
   std::string serverName_;
   uint32_t serverMaxFrame_ = 0;

@@ -48,6 +48,10 @@ std::string ConnectionRules::lengthProblem(uint32_t length) const {
 FrameOutcome ConnectionRules::onFrame(const Frame& frame) {
   if (!greeted()) return onHello(frame);
   if (frame.type == MessageType::Hello) return outcome(Action::Refuse, "hello sent twice");
+  if (frame.type == MessageType::TokenRequest) {
+    return outcome(Action::Refuse, options_.token.empty() ? "this server asks for no token"
+                                                          : "the token was already proven");
+  }
   if (frame.type == MessageType::Ping && version_ >= 2) return pong(frame);
   if (!isRequest(frame.type, version_)) {
     return outcome(Action::Refuse,

@@ -1,4 +1,4 @@
-// Parsing of "HOST:PORT", "[ADDRESS]:PORT" and "tcp://HOST:PORT".
+// Parsing of "HOST:PORT", "[ADDRESS]:PORT" and "tcp://HOST:PORT" or "tls://HOST:PORT".
 #include "ZinNet/Endpoint.h"
 
 #include <stdexcept>
@@ -59,12 +59,23 @@ Endpoint parseEndpoint(std::string_view text, bool allowAnyPort) {
   return endpoint;
 }
 
-std::optional<Endpoint> parseTcpTarget(std::string_view target) {
-  constexpr std::string_view kScheme = "tcp://";
-  if (target.substr(0, kScheme.size()) != kScheme) return std::nullopt;
-  std::string_view rest = target.substr(kScheme.size());
+namespace {
+
+std::optional<Endpoint> parseSchemeTarget(std::string_view target, std::string_view scheme) {
+  if (target.substr(0, scheme.size()) != scheme) return std::nullopt;
+  std::string_view rest = target.substr(scheme.size());
   if (!rest.empty() && rest.back() == '/') rest.remove_suffix(1);
   return parseEndpoint(rest, false);
+}
+
+}  // namespace
+
+std::optional<Endpoint> parseTcpTarget(std::string_view target) {
+  return parseSchemeTarget(target, "tcp://");
+}
+
+std::optional<Endpoint> parseTlsTarget(std::string_view target) {
+  return parseSchemeTarget(target, "tls://");
 }
 
 }  // namespace ZinNet

@@ -133,6 +133,18 @@ std::string typeText(uint8_t type) {
     case MessageType::Pong:
       name = "pong";
       break;
+    case MessageType::TokenRequest:
+      name = "token request";
+      break;
+    case MessageType::TokenProof:
+      name = "token proof";
+      break;
+    case MessageType::TokenChallenge:
+      name = "token challenge";
+      break;
+    case MessageType::TokenAccepted:
+      name = "token accepted";
+      break;
     case MessageType::Welcome:
       name = "welcome";
       break;

@@ -11,6 +11,8 @@
 #include "Asio.h"
 #include "ServerConnection.h"
 #include "ServerState.h"
+#include "TlsContext.h"
+#include "ZinNet/Token.h"
 
 namespace ZinNet {
 
@@ -20,6 +22,7 @@ struct Server::Impl {
   Impl(std::shared_ptr<ZinRT::Zin_Transport> transport, ServerOptions options)
       : state(std::make_shared<ServerState>(std::move(transport), std::move(options))) {}
 
+  void prepareSecurity();
   void listen();
   void accept();
   void onAccepted(std::error_code ec, tcp::socket socket);
@@ -57,18 +60,46 @@ void Server::Impl::listen() {
     throw std::runtime_error("ZinNet: cannot listen on " + where + ": " +
                              (ec ? ec.message() : "no such address"));
   }
-  acceptor.emplace(io);
   const tcp::endpoint endpoint = results.begin()->endpoint();
+  const bool open = !endpoint.address().is_loopback();
+  if (open && options.token.empty() && !options.insecure) {
+    throw std::runtime_error("ZinNet: refusing to listen on " + where +
+                             " without a token: other machines could drive the target. Give a "
+                             "token, or allow it knowingly (insecure)");
+  }
+  acceptor.emplace(io);
   acceptor->open(endpoint.protocol(), ec);
   if (!ec) acceptor->set_option(tcp::acceptor::reuse_address(true), ec);
   if (!ec) acceptor->bind(endpoint, ec);
   if (!ec) acceptor->listen(asio::socket_base::max_listen_connections, ec);
   if (!ec) bound = acceptor->local_endpoint(ec);
   if (ec) throw std::runtime_error("ZinNet: cannot listen on " + where + ": " + ec.message());
-  const bool loopback = bound.address().is_loopback();
+  const std::string guard = options.token.empty() ? "" : ", token required";
+  const std::string tls = state->tls ? ", TLS" : "";
   state->log("listening on " + bound.address().to_string() + ":" + std::to_string(bound.port()) +
-             (loopback ? " (loopback only: other machines cannot connect)"
-                       : " (open to other machines: whoever reaches this port drives the target)"));
+             (!open ? " (loopback only: other machines cannot connect" + guard + tls + ")"
+              : options.token.empty()
+                  ? " (WARNING: open to other machines without a token: whoever reaches this "
+                    "port drives the target" +
+                        tls + ")"
+                  : " (open to other machines" + guard + tls + ")"));
+}
+
+void Server::Impl::prepareSecurity() {
+  const ServerOptions& options = state->options;
+  if (!options.token.empty()) {
+    try {
+      checkToken(options.token, "the server's options");
+    } catch (const std::invalid_argument& error) {
+      throw std::runtime_error(error.what());
+    }
+  }
+  if (options.tlsCertFile.empty() != options.tlsKeyFile.empty()) {
+    throw std::runtime_error("ZinNet: TLS needs both a certificate file and a key file");
+  }
+  if (!options.tlsCertFile.empty()) {
+    state->tls = serverTlsContext(options.tlsCertFile, options.tlsKeyFile);
+  }
 }
 
 void Server::Impl::accept() {
@@ -163,6 +194,7 @@ void Server::start() {
     impl_->started = true;
   }
   try {
+    impl_->prepareSecurity();
     impl_->listen();
   } catch (...) {
     std::lock_guard<std::mutex> lock(impl_->stateMutex);

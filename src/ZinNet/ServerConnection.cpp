@@ -11,18 +11,18 @@ using Protocol::MessageType;
 ServerConnection::ServerConnection(std::shared_ptr<ServerState> state, asio::ip::tcp::socket socket,
                                    asio::any_io_executor requests, uint64_t id)
     : state_(std::move(state)),
-      socket_(std::move(socket)),
+      stream_(std::move(socket)),
       requests_(std::move(requests)),
       id_(id),
       rules_(state_->options),
-      timer_(socket_.get_executor()) {
+      timer_(stream_.get_executor()) {
   std::error_code ec;
-  const auto remote = socket_.remote_endpoint(ec);
+  const auto remote = stream_.socket().remote_endpoint(ec);
   peer_ = ec ? std::string("an unknown peer")
              : remote.address().to_string() + ":" + std::to_string(remote.port());
-  socket_.set_option(asio::ip::tcp::no_delay(true), ec);
+  stream_.socket().set_option(asio::ip::tcp::no_delay(true), ec);
   // Replies are first written directly; only what the socket does not take at once waits.
-  socket_.non_blocking(true, ec);
+  stream_.socket().non_blocking(true, ec);
   ++state_->connectionsOpen;
 }
 
@@ -32,8 +32,39 @@ ServerConnection::~ServerConnection() {
 
 void ServerConnection::start() {
   state_->log("connection " + std::to_string(id_) + " from " + peer_ + " opened");
-  armTimer(state_->options.greetingTimeoutMs, "the greeting");
+  greetingDeadline_ = std::chrono::steady_clock::now() +
+                      std::chrono::milliseconds(state_->options.greetingTimeoutMs);
+  armGreetingTimer();
+  if (!state_->tls) {
+    readNext();
+    return;
+  }
+  stream_.startTls(*state_->tls)
+      .async_handshake(
+          asio::ssl::stream_base::server,
+          [self = shared_from_this()](std::error_code ec) { self->afterHandshake(ec); });
+}
+
+void ServerConnection::afterHandshake(std::error_code ec) {
+  if (closed_) return;
+  if (ec) {
+    ++state_->framesRefused;
+    close("TLS handshake failed: " + ec.message());
+    return;
+  }
   readNext();
+}
+
+// The handshake, the hello and the token proof share one deadline from the connection's start.
+void ServerConnection::armGreetingTimer() {
+  if (state_->options.greetingTimeoutMs == 0) {
+    disarmTimer();
+    return;
+  }
+  const auto left = std::chrono::duration_cast<std::chrono::milliseconds>(
+      greetingDeadline_ - std::chrono::steady_clock::now());
+  armTimer(static_cast<uint32_t>(std::max<int64_t>(1, left.count())), "the greeting",
+           state_->options.greetingTimeoutMs);
 }
 
 bool ServerConnection::evictable(std::chrono::steady_clock::time_point& since) const {
@@ -46,8 +77,8 @@ void ServerConnection::close(const std::string& why) {
   closed_ = true;
   std::error_code ec;
   timer_.cancel();
-  socket_.shutdown(asio::ip::tcp::socket::shutdown_both, ec);
-  socket_.close(ec);
+  stream_.socket().shutdown(asio::ip::tcp::socket::shutdown_both, ec);
+  stream_.socket().close(ec);
   state_->log("connection " + std::to_string(id_) + " closed after " +
               std::to_string(requestCount_) + " requests: " + why);
 }
@@ -55,6 +86,10 @@ void ServerConnection::close(const std::string& why) {
 void ServerConnection::refuseAndClose(const std::string& why) {
   leaving_ = true;
   state_->log("connection from " + peer_ + " refused: " + why);
+  if (state_->tls) {
+    close(why);  // a TLS client could not read a frame sent before the handshake
+    return;
+  }
   send(textFrame(MessageType::Closing, why), true);
 }
 
@@ -65,11 +100,11 @@ void ServerConnection::refuse(const std::string& why, bool thenClose) {
   send(textFrame(thenClose ? MessageType::Closing : MessageType::Refused, why), thenClose);
 }
 
-void ServerConnection::armTimer(uint32_t ms, const char* what) {
+void ServerConnection::armTimer(uint32_t ms, const char* what, uint32_t limitMs) {
   deadlineSet_ = ms != 0;
   if (!deadlineSet_) return;
   deadline_ = Clock::now() + std::chrono::milliseconds(ms);
-  deadlineMs_ = ms;
+  deadlineMs_ = limitMs == 0 ? ms : limitMs;
   deadlineWhat_ = what;
   if (!timerPending_ || timerAt_ > deadline_) startTimer(deadline_);
 }
@@ -100,7 +135,9 @@ void ServerConnection::onTimer(std::error_code ec, uint64_t generation) {
 
 void ServerConnection::onReadError(std::error_code ec, const char* where) {
   if (closed_) return;
-  const bool ended = ec == asio::error::eof || ec == asio::error::connection_reset;
+  // A TLS client that closes without the layer's close notification truncates the stream.
+  const bool ended = ec == asio::error::eof || ec == asio::error::connection_reset ||
+                     ec == asio::ssl::error::stream_truncated;
   if (ended && std::strcmp(where, "between frames") == 0) {
     close("the client closed the connection");
     return;
@@ -118,11 +155,16 @@ void ServerConnection::onReadError(std::error_code ec, const char* where) {
 void ServerConnection::readNext() {
   if (closed_) return;
   if (rules_.greeted()) {
-    if (headBytes_ == 0) {
+    // Until the client is admitted, the greeting's deadline holds for every frame.
+    if (!admitted_) {
+      armGreetingTimer();
+    } else if (headBytes_ == 0) {
       armTimer(state_->options.idleTimeoutMs, "waiting for a frame");
     } else {
       armTimer(state_->options.frameTimeoutMs, "a frame");
-      asio::post(socket_.get_executor(), [self = shared_from_this()] { self->takeFrame(); });
+    }
+    if (headBytes_ != 0) {
+      asio::post(stream_.get_executor(), [self = shared_from_this()] { self->takeFrame(); });
       return;
     }
   }
@@ -130,7 +172,7 @@ void ServerConnection::readNext() {
 }
 
 void ServerConnection::readMore() {
-  socket_.async_read_some(
+  stream_.async_read_some(
       asio::buffer(head_.data() + headBytes_, head_.size() - headBytes_),
       [self = shared_from_this()](std::error_code ec, size_t n) { self->onRead(ec, n); });
 }
@@ -142,7 +184,7 @@ void ServerConnection::onRead(std::error_code ec, size_t n) {
                                                           : "inside a frame");
     return;
   }
-  if (headBytes_ == 0 && n != 0 && rules_.greeted()) {
+  if (headBytes_ == 0 && n != 0 && admitted_) {
     armTimer(state_->options.frameTimeoutMs, "a frame");
   }
   headBytes_ += n;
@@ -156,7 +198,12 @@ void ServerConnection::takeFrame() {
     return;
   }
   const uint32_t length = decodeLength(head_.data());
-  const std::string problem = rules_.lengthProblem(length);
+  // Between the hello and the token proof only the small token frames may come.
+  const std::string problem =
+      rules_.greeted() && !admitted_ && length > kMaxTokenFrame
+          ? "frame of " + std::to_string(length) + " bytes exceeds the limit of " +
+                std::to_string(kMaxTokenFrame) + " bytes"
+          : rules_.lengthProblem(length);
   if (!problem.empty()) {
     refuse(problem, true);
     return;
@@ -180,7 +227,7 @@ void ServerConnection::readBody(uint32_t length) {
   body_.assign(length, 0);
   std::memcpy(body_.data(), head_.data() + Protocol::kLengthBytes, have);
   headBytes_ = 0;
-  asio::async_read(socket_, asio::buffer(body_.data() + have, length - have),
+  asio::async_read(stream_, asio::buffer(body_.data() + have, length - have),
                    [self = shared_from_this()](std::error_code ec, size_t) {
                      if (ec) {
                        self->onReadError(ec, "inside a frame");
@@ -196,7 +243,13 @@ void ServerConnection::onFrame(Frame frame) {
   if (closed_) return;
   disarmTimer();
   inExchange_ = true;
+  if (rules_.greeted() && !admitted_) {
+    onTokenStep(frame);
+    return;
+  }
+  const bool greeted = rules_.greeted();
   FrameOutcome outcome = rules_.onFrame(frame);
+  if (!greeted && rules_.greeted()) admitted_ = state_->options.token.empty();
   switch (outcome.action) {
     case FrameOutcome::Action::Request:
       runRequest(std::move(frame));
@@ -241,7 +294,7 @@ void ServerConnection::runRequest(Frame frame) {
       reply = carryOut(frame, *self->state_->transport, self->state_->options.maxReadBytes);
     }
     --self->state_->handedOff;
-    asio::post(self->socket_.get_executor(), [self, type, reply = std::move(reply)]() mutable {
+    asio::post(self->stream_.get_executor(), [self, type, reply = std::move(reply)]() mutable {
       self->finishRequest(type, std::move(reply));
     });
   });
@@ -267,14 +320,14 @@ void ServerConnection::lingerAndClose() {
   // Stop sending, then drop what the client still sends until it closes too (bounded by a
   // timer), so that the closing frame is not lost to a reset caused by unread bytes.
   std::error_code ec;
-  socket_.shutdown(asio::ip::tcp::socket::shutdown_send, ec);
+  stream_.socket().shutdown(asio::ip::tcp::socket::shutdown_send, ec);
   lingering_ = true;
   armTimer(kLingerMs, "closing");
   drain();
 }
 
 void ServerConnection::drain() {
-  socket_.async_read_some(asio::buffer(head_),
+  stream_.async_read_some(asio::buffer(head_),
                           [self = shared_from_this()](std::error_code ec, size_t) {
                             if (self->closed_) return;
                             if (ec) {
@@ -287,20 +340,21 @@ void ServerConnection::drain() {
 
 void ServerConnection::send(std::vector<unsigned char> bytes, bool thenClose) {
   if (closed_) return;
-  // Most replies fit the socket's buffer and are written at once, without a timer.
+  // Most replies fit the socket's buffer and are written at once, without a timer. A TLS
+  // layer keeps records of its own, so its replies always take the asynchronous path.
   std::error_code ec;
-  const size_t written = socket_.write_some(asio::buffer(bytes), ec);
-  if (!ec && written == bytes.size()) {
-    afterSend(ec, thenClose);
-    return;
-  }
-  if (ec && ec != asio::error::would_block && ec != asio::error::try_again) {
-    afterSend(ec, thenClose);
-    return;
+  size_t written = 0;
+  if (!stream_.secure()) {
+    written = stream_.socket().write_some(asio::buffer(bytes), ec);
+    if ((!ec && written == bytes.size()) ||
+        (ec && ec != asio::error::would_block && ec != asio::error::try_again)) {
+      afterSend(ec, thenClose);
+      return;
+    }
   }
   outgoing_ = std::move(bytes);
   armTimer(state_->options.writeTimeoutMs, "sending a reply");
-  asio::async_write(socket_, asio::buffer(outgoing_.data() + written, outgoing_.size() - written),
+  asio::async_write(stream_, asio::buffer(outgoing_.data() + written, outgoing_.size() - written),
                     [self = shared_from_this(), thenClose](std::error_code e, size_t) {
                       if (self->closed_) return;
                       self->outgoing_ = {};  // no reply is kept between requests

@@ -12,8 +12,10 @@
 #include "Asio.h"
 #include "ConnectionRules.h"
 #include "Frame.h"
+#include "NetStream.h"
 #include "RequestHandler.h"
 #include "ServerState.h"
+#include "TokenProof.h"
 
 namespace ZinNet {
 
@@ -48,6 +50,12 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   void takeFrame();
   void readBody(uint32_t length);
   void onFrame(Frame frame);
+  void onTokenStep(const Frame& frame);
+  void onTokenRequest(const Frame& frame);
+  void onTokenProof(const Frame& frame);
+  void refuseToken(const std::string& why);
+  void afterHandshake(std::error_code ec);
+  void armGreetingTimer();
   void runRequest(Frame frame);
   void finishRequest(Protocol::MessageType type, Reply reply);
   void send(std::vector<unsigned char> bytes, bool thenClose);
@@ -55,14 +63,16 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   void lingerAndClose();
   void drain();
   void refuse(const std::string& why, bool thenClose);
-  void armTimer(uint32_t ms, const char* what);
+  /// Sets the deadline `ms` from now; when it passes, the connection closes and the message
+  /// names `limitMs` (else `ms`).
+  void armTimer(uint32_t ms, const char* what, uint32_t limitMs = 0);
   void disarmTimer() { deadlineSet_ = false; }
   void startTimer(Clock::time_point at);
   void onTimer(std::error_code ec, uint64_t generation);
   void onReadError(std::error_code ec, const char* where);
 
   std::shared_ptr<ServerState> state_;
-  asio::ip::tcp::socket socket_;
+  NetStream stream_;
   asio::any_io_executor requests_;
   uint64_t id_;
   ConnectionRules rules_;  // the greeting, its version and the checks of each frame
@@ -85,6 +95,12 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   std::vector<unsigned char> body_;
   std::vector<unsigned char> outgoing_;
   static constexpr uint32_t kLingerMs = 1000;
+  static constexpr uint32_t kMaxTokenFrame = 64;  // the token frames have 33 bytes
+  bool admitted_ = false;    // greeted, and the token proven when the server has one
+  bool challenged_ = false;  // a token challenge was sent
+  Nonce clientNonce_{};
+  Nonce serverNonce_{};
+  std::chrono::steady_clock::time_point greetingDeadline_{};
   bool closed_ = false;
   bool leaving_ = false;     // a closing frame is being sent
   bool lingering_ = false;   // the closing frame is sent; waiting for the client to close

@@ -24,6 +24,7 @@ ServerStats ServerState::snapshot() const {
   stats.connectionsOpen = connectionsOpen.load();
   stats.requestsServed = requestsServed.load();
   stats.framesRefused = framesRefused.load();
+  stats.tokensRefused = tokensRefused.load();
   return stats;
 }
 

@@ -34,6 +34,8 @@ struct ServerState {
   std::atomic<uint64_t> connectionsOpen{0};
   std::atomic<uint64_t> requestsServed{0};
   std::atomic<uint64_t> framesRefused{0};
+  std::atomic<uint64_t> tokensRefused{0};
+  std::unique_ptr<asio::ssl::context> tls;  // set when clients must speak TLS
 };
 
 }  // namespace ZinNet

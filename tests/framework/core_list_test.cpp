@@ -1,7 +1,5 @@
 // The core list (ownership, replacement, session close) and status reads and command sequences
 // through a session's transport. The status word layouts are decoded in tests/mox.
-#include <gtest/gtest.h>
-
 #include <atomic>
 #include <memory>
 #include <stdexcept>
@@ -10,7 +8,7 @@
 #include "ZinRT/ZinJtag.h"
 #include "ZinRT/Zin_CoreComm.h"
 #include "ZinRT/Zin_CoreList.h"
-#include "ZinTestKit/ScriptedTransport.h"
+#include "support/SessionFixture.h"
 
 using ZinRT::Zin_Core;
 using ZinRT::Zin_CoreList;
@@ -19,6 +17,13 @@ using ZinTestKit::ScriptedTransport;
 namespace {
 
 std::atomic<int> destroyed{0};
+std::vector<uint32_t> progressCalls;
+
+ZIN_PROGRESS_RETURN onProgress(uint32_t done, uint32_t all, uint32_t bits,
+                               ZIN_PROGRESS_STATUS status) {
+  progressCalls = {done, all, bits, static_cast<uint32_t>(status)};
+  return ZIN_PROGRESS_CONTINUE;
+}
 
 class CountedCore : public Zin_Core {
  public:
@@ -27,18 +32,12 @@ class CountedCore : public Zin_Core {
   ~CountedCore() override { ++destroyed; }
 };
 
-class CoreListTest : public ::testing::Test {
+class CoreListTest : public ZinTest::SessionFixture {
  protected:
   void SetUp() override {
-    transport = std::make_shared<ScriptedTransport>();
-    handle = ZinJtag_openSession(transport);
+    SessionFixture::SetUp();
     destroyed = 0;
   }
-  void TearDown() override {
-    if (handle != 0) ZinJtag_closeSession(handle);
-  }
-  std::shared_ptr<ScriptedTransport> transport;
-  uint32_t handle = 0;
 };
 
 }  // namespace
@@ -82,15 +81,6 @@ TEST_F(CoreListTest, AddReplaceRemoveAndSessionCloseOwnTheCores) {
   ZinJtag_closeSession(otherHandle);
   EXPECT_EQ(destroyed, 5);
 }
-
-namespace {
-std::vector<uint32_t> progressCalls;
-ZIN_PROGRESS_RETURN onProgress(uint32_t done, uint32_t all, uint32_t bits,
-                               ZIN_PROGRESS_STATUS status) {
-  progressCalls = {done, all, bits, static_cast<uint32_t>(status)};
-  return ZIN_PROGRESS_CONTINUE;
-}
-}  // namespace
 
 // Status reads through the C entry point, which reports failures as a status instead of throwing
 // (the kept bit counts are checked in tests/mox), and command sequences.

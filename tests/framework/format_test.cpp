@@ -114,18 +114,17 @@ TEST(Format, ConversionsMatchBitByBitReferences) {
 
 TEST(Format, MalformedInputIsRejectedWithItsText) {
   std::string out;
-  EXPECT_EQ(rejection([&] { Zin_NumberUtil::binStr2HexStr("10x1", out); }),
-            "Zin_NumberUtil::binStr2HexStr: not a bit character (code 120)");
+  const std::string notBit = "Zin_NumberUtil::binStr2HexStr: not a bit character (code ",
+                    notHex =
+                        "Zin_NumberUtil::hexStr2BinStr: not a hexadecimal digit (character code ";
+  EXPECT_EQ(rejection([&] { Zin_NumberUtil::binStr2HexStr("10x1", out); }), notBit + "120)");
   // In a whole word too: the word reader must not take it for bits.
   EXPECT_EQ(rejection([&] { Zin_NumberUtil::binStr2HexStr("1111111111112111", out); }),
-            "Zin_NumberUtil::binStr2HexStr: not a bit character (code 50)");
-  EXPECT_EQ(rejection([&] { Zin_NumberUtil::hexStr2BinStr("1G", 8, out); }),
-            "Zin_NumberUtil::hexStr2BinStr: not a hexadecimal digit (character code 71)");
-  EXPECT_EQ(rejection([&] { Zin_NumberUtil::hexStr2BinStr("Z1", 4, out); }),
-            "Zin_NumberUtil::hexStr2BinStr: not a hexadecimal digit (character code 90)")
+            notBit + "50)");
+  EXPECT_EQ(rejection([&] { Zin_NumberUtil::hexStr2BinStr("1G", 8, out); }), notHex + "71)");
+  EXPECT_EQ(rejection([&] { Zin_NumberUtil::hexStr2BinStr("Z1", 4, out); }), notHex + "90)")
       << "digits above the kept bits are checked too";
-  EXPECT_EQ(rejection([&] { Zin_NumberUtil::hexStr2BinStr("x0G", 4, out); }),
-            "Zin_NumberUtil::hexStr2BinStr: not a hexadecimal digit (character code 71)")
+  EXPECT_EQ(rejection([&] { Zin_NumberUtil::hexStr2BinStr("x0G", 4, out); }), notHex + "71)")
       << "the last bad digit is met first";
   EXPECT_EQ(rejection([&] { delete textBuffer("12G4").hex2Bin(0, 3); }),
             "Zin_ByteBuffer::hex2Bin: not a hexadecimal digit (character code 71)");

@@ -30,11 +30,7 @@ BitVector hubReply(const BitVector& record, unsigned captureWord = 0x015A) {
 
 BitVector statusRecord() {
   BitVector record;
-  appendNumber(record, 0xA5, 8);  // manufacturer
-  appendNumber(record, 9, 8);     // MOX
-  appendNumber(record, 10, 8);    // major
-  appendNumber(record, 2, 8);     // minor
-  appendNumber(record, 1, 8);     // revision
+  appendNumber(record, 0x01020A09A5ULL, 40);  // revision 1, minor 2, major 10, MOX, maker 0xA5
   appendNumber(record, 0x0123456789ULL, 64);
   record.resize(kStatusRecordBits, 1);
   return record;

@@ -169,13 +169,9 @@ TEST_F(Arrays, ThreeSamplesLandOneBlockApart) {
         EXPECT_EQ(buffer[k * width + b] & mask, expected[b]) << "byte " << b;
       }
     };
-    expectBlock(x[0], 2, blockOf(images[k].asyncValue, x12), 0x0F);
-    expectBlock(x[1], 2, blockOf(images[k].asyncUp, x12), 0x0F);
-    expectBlock(x[2], 2, blockOf(images[k].asyncDown, x12), 0x0F);
-    expectBlock(y[0], 1, blockOf(images[k].syncValue, y3), 0x07);
-    expectBlock(y[1], 1, blockOf(images[k].syncUp, y3), 0x07);
-    expectBlock(y[2], 1, blockOf(images[k].syncDown, y3), 0x07);
-    expectBlock(y[4], 1, blockOf(images[k].syncSyncDown, y3), 0x07);
+    const auto vectors = images[k].vectors();  // x[v] holds async vector v, y[v] sync vector v
+    for (int v : {0, 1, 2}) expectBlock(x[v], 2, blockOf(*vectors[v], x12), 0x0F);
+    for (int v : {0, 1, 2, 4}) expectBlock(y[v], 1, blockOf(*vectors[3 + v], y3), 0x07);
   }
   EXPECT_EQ(x[0][1] & 0xF0, 0xF0);
   EXPECT_EQ(y[3], std::vector<uint8_t>(3, 0));
@@ -196,11 +192,12 @@ TEST_F(Arrays, ReadsCheckSizesAndNamesBeforeReading) {
   std::vector<uint8_t> buffer(6, 0xEE);
   uint8_t* values[2] = {buffer.data(), buffer.data()};
   uint32_t sizes[2] = {5, 6};
+  const auto read = [&](std::vector<std::string> names, uint32_t count, uint32_t n,
+                        const uint32_t* s) {
+    core->readValues(handle, ref, names, values, nullptr, nullptr, nullptr, nullptr, s, count, n);
+  };
   const auto failure = [&](std::vector<std::string> names, uint32_t count, uint32_t samples) {
-    return logicErrorOf([&] {
-      core->readValues(handle, ref, names, values, nullptr, nullptr, nullptr, nullptr, sizes, count,
-                       samples);
-    });
+    return logicErrorOf([&] { read(names, count, samples, sizes); });
   };
   EXPECT_EQ(failure({"x12"}, 1, 3), kTooSmall + "x12");
   EXPECT_EQ(failure({"a8", "x12"}, 2, 3), "Could not find a signal with the name: a8");
@@ -208,16 +205,12 @@ TEST_F(Arrays, ReadsCheckSizesAndNamesBeforeReading) {
       << "the checks run even for 0 samples";
   sizes[0] = 6;  // enough for three samples of twelve bits
   EXPECT_EQ(failure({"x12", "nope"}, 2, 3), "Could not find a signal with the name: nope");
-  EXPECT_THROW(core->readValues(handle, ref, {"x12"}, values, nullptr, nullptr, nullptr, nullptr,
-                                nullptr, 1, 1),
-               std::logic_error);
-  EXPECT_THROW(core->readValues(handle, ref, {"x12"}, values, nullptr, nullptr, nullptr, nullptr,
-                                sizes, 2, 1),
-               std::logic_error);
-  core->readValues(handle, ref, {"x12"}, values, nullptr, nullptr, nullptr, nullptr, sizes, 1, 0);
+  EXPECT_THROW(read({"x12"}, 1, 1, nullptr), std::logic_error);
+  EXPECT_THROW(read({"x12"}, 2, 1, sizes), std::logic_error);
+  read({"x12"}, 1, 0, sizes);
   EXPECT_TRUE(transport->transfers().empty());
   EXPECT_EQ(buffer, std::vector<uint8_t>(6, 0xEE)) << "zero samples: nothing read or written";
-  core->readValues(handle, ref, {"x12"}, values, nullptr, nullptr, nullptr, nullptr, sizes, 1, 3);
+  read({"x12"}, 1, 3, sizes);
   EXPECT_EQ(transport->transfers().size(), 3u);
 }
 

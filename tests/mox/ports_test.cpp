@@ -14,13 +14,25 @@ using namespace ZinTest;
 
 class Ports : public SessionFixture {
  protected:
+  uint32_t set(const uint8_t* asyncData, const uint8_t* asyncMask, uint32_t asyncCount,
+               const uint8_t* syncData, const uint8_t* syncMask, uint32_t syncCount) {
+    return ZinMOX_setPortBits(handle, &ref, asyncData, asyncMask, asyncCount, syncData, syncMask,
+                              syncCount);
+  }
+  // Reads into eight vectors `v` of `bytes` bytes, filled with 0xEE first; `skip` leaves that
+  // pointer null.
+  uint32_t get(std::vector<std::vector<uint8_t>>& v, uint32_t asyncCount, uint32_t syncCount,
+               int skip = -1, std::size_t bytes = 2) {
+    v.assign(8, std::vector<uint8_t>(bytes, 0xEE));
+    std::array<uint8_t*, 8> p{};
+    for (int k = 0; k < 8; ++k) p[k] = k == skip ? nullptr : v[k].data();
+    return ZinMOX_getPortBits(handle, &ref, p[0], p[1], p[2], asyncCount, p[3], p[4], p[5], p[6],
+                              p[7], syncCount);
+  }
   // Reads the whole input image through ZinMOX_getPortBits.
   InputImage readAll(uint32_t asyncIn, uint32_t syncIn) {
-    std::vector<std::vector<uint8_t>> v(8, std::vector<uint8_t>((asyncIn + syncIn) / 8 + 1, 0));
-    EXPECT_EQ(
-        ZinMOX_getPortBits(handle, &ref, v[0].data(), v[1].data(), v[2].data(), asyncIn,
-                           v[3].data(), v[4].data(), v[5].data(), v[6].data(), v[7].data(), syncIn),
-        0u);
+    std::vector<std::vector<uint8_t>> v;
+    EXPECT_EQ(get(v, asyncIn, syncIn, -1, (asyncIn + syncIn) / 8 + 1), 0u);
     InputImage image = InputImage::zeros(asyncIn, syncIn);
     const auto fields = image.vectors();
     for (std::size_t k = 0; k < 8; ++k) {
@@ -29,8 +41,7 @@ class Ports : public SessionFixture {
     return image;
   }
   static void expectImage(const InputImage& actual, const InputImage& expected) {
-    for (std::size_t k = 0; k < 8; ++k)
-      EXPECT_EQ(*actual.vectors()[k], *expected.vectors()[k]) << k;
+    for (std::size_t k = 0; k < 8; ++k) EXPECT_EQ(*actual.vectors()[k], *expected.vectors()[k]);
   }
 };
 
@@ -62,8 +73,7 @@ TEST_F(Ports, WriteTextsCarryValuesStepsAndMarksInOrder) {
     initMoxCore(ref, 0, 0, c.asyncOut, c.syncOut);
     std::vector<uint8_t> steps(16);
     for (int t = 0; t < 16 && c.step != nullptr; ++t) steps[t] = c.step(t);
-    ASSERT_EQ(ZinMOX_setPortBits(handle, &ref, &c.asyncData, &c.asyncMask, c.asyncOut, steps.data(),
-                                 &c.syncMask, c.syncOut),
+    ASSERT_EQ(set(&c.asyncData, &c.asyncMask, c.asyncOut, steps.data(), &c.syncMask, c.syncOut),
               0u);
     const auto sent = transport->transfers();
     ASSERT_EQ(sent.size(), 1u);
@@ -108,7 +118,7 @@ TEST_F(Ports, ReadTextsRoundEachLineToWholeBytesAndTheDataUnpacks) {
 
 TEST_F(Ports, PortsOfWidthZeroSendNothing) {
   initMoxCore(ref, 4, 4, 0, 0);
-  EXPECT_EQ(ZinMOX_setPortBits(handle, &ref, nullptr, nullptr, 0, nullptr, nullptr, 0), 0u);
+  EXPECT_EQ(set(nullptr, nullptr, 0, nullptr, nullptr, 0), 0u);
   ZinRT::ZinMOX_ValueMap map;
   uintptr_t word = mapWord(map);
   EXPECT_EQ(ZinMOX_writeValues(handle, &ref, &word), 0u);
@@ -130,21 +140,20 @@ TEST_F(Ports, OutputImagePersistsAndUpdateMarksFollowEachWrite) {
   const uint8_t asyncData = 0x2D, asyncMask = 0x3F;  // "101101" from bit 0
   std::vector<uint8_t> steps(16, 0x02);              // sync bit 1 high on every step
   const uint8_t syncMask = 0x02, asyncData2 = 0x01, asyncMask2 = 0x01;
-  ASSERT_EQ(ZinMOX_setPortBits(handle, &ref, &asyncData, &asyncMask, 6, steps.data(), &syncMask, 2),
-            0u);
+  ASSERT_EQ(set(&asyncData, &asyncMask, 6, steps.data(), &syncMask, 2), 0u);
   const WriteImage first = lastWrite(6, 2);
   EXPECT_EQ(first.asyncValues, "101101");
   EXPECT_EQ(first.asyncUpdate, "111111");
   EXPECT_EQ(first.steps, (std::vector<std::string>{std::string(16, '0'), std::string(16, '1')}));
   EXPECT_EQ(first.syncUpdate, "01");
   // Both counts 0: the same values again, with no update mark.
-  ASSERT_EQ(ZinMOX_setPortBits(handle, &ref, nullptr, nullptr, 0, nullptr, nullptr, 0), 0u);
+  ASSERT_EQ(set(nullptr, nullptr, 0, nullptr, nullptr, 0), 0u);
   WriteImage expected = first;
   expected.asyncUpdate = "000000";
   expected.syncUpdate = "00";
   EXPECT_EQ(writeDataHex(lastWrite(6, 2)), writeDataHex(expected));
   // Only the asynchronous port: the synchronous marks are cleared.
-  ASSERT_EQ(ZinMOX_setPortBits(handle, &ref, &asyncData2, &asyncMask2, 6, nullptr, nullptr, 0), 0u);
+  ASSERT_EQ(set(&asyncData2, &asyncMask2, 6, nullptr, nullptr, 0), 0u);
   expected.asyncValues = expected.asyncUpdate = "100000";
   EXPECT_EQ(writeDataHex(lastWrite(6, 2)), writeDataHex(expected));
   EXPECT_EQ(transport->flushCount(), 3u);
@@ -153,8 +162,8 @@ TEST_F(Ports, OutputImagePersistsAndUpdateMarksFollowEachWrite) {
 // A_in 10, S_in 3, A_out 12, S_out 10: two bytes per vector on three of the ports.
 constexpr uint32_t kAsyncIn = 10, kSyncIn = 3, kAsyncOut = 12, kSyncOut = 10;
 
-std::string countMessage(const char* call, const char* count, const char* type) {
-  return std::string(call) + "() arg. failed:(" + count +
+std::string countMessage(const std::string& call, const char* count, const char* type) {
+  return call + "() arg. failed:(" + count +
          " == core->getCorePhysicalSignalCount(Zin_SignalBase::SIGNAL_TYPE_MOX_" + type +
          ")) || (" + count + " == 0)";
 }
@@ -165,27 +174,12 @@ class PortBits : public Ports {
     Ports::SetUp();
     initMoxCore(ref, kAsyncIn, kSyncIn, kAsyncOut, kSyncOut);
   }
-  uint32_t set(const uint8_t* asyncData, const uint8_t* asyncMask, uint32_t asyncCount,
-               const uint8_t* syncData, const uint8_t* syncMask, uint32_t syncCount) {
-    return ZinMOX_setPortBits(handle, &ref, asyncData, asyncMask, asyncCount, syncData, syncMask,
-                              syncCount);
-  }
-  // Reads into eight vectors `v`, filled with 0xEE first; `skip` leaves that pointer null.
-  uint32_t get(std::vector<std::vector<uint8_t>>& v, uint32_t asyncCount, uint32_t syncCount,
-               int skip = -1) {
-    v.assign(8, std::vector<uint8_t>(2, 0xEE));
-    std::array<uint8_t*, 8> p{};
-    for (int k = 0; k < 8; ++k) p[k] = k == skip ? nullptr : v[k].data();
-    return ZinMOX_getPortBits(handle, &ref, p[0], p[1], p[2], asyncCount, p[3], p[4], p[5], p[6],
-                              p[7], syncCount);
-  }
 };
 
 TEST_F(PortBits, CountAndPointerChecksRunInOrderAndSendNothing) {
-  const std::string asyncOut =
-                        countMessage("ZinMOX_setPortBits", "asyncOutDataBitCount", "ASYNC_OUTPUT"),
-                    syncOut =
-                        countMessage("ZinMOX_setPortBits", "syncOutDataBitCount", "SYNC_OUTPUT");
+  const std::string setCall = "ZinMOX_setPortBits", getCall = "ZinMOX_getPortBits";
+  const std::string asyncOut = countMessage(setCall, "asyncOutDataBitCount", "ASYNC_OUTPUT"),
+                    syncOut = countMessage(setCall, "syncOutDataBitCount", "SYNC_OUTPUT");
   std::vector<uint8_t> any(64, 0);
   const uint8_t* p = any.data();
   EXPECT_EQ(errorOf(set(p, p, kAsyncOut - 1, p, p, kSyncOut)), asyncOut);
@@ -194,9 +188,8 @@ TEST_F(PortBits, CountAndPointerChecksRunInOrderAndSendNothing) {
   EXPECT_EQ(errorOf(set(p, p, 0, p, p, kSyncOut + 1)), syncOut);
   EXPECT_EQ(errorOf(set(nullptr, nullptr, kAsyncOut, p, p, kSyncOut + 1)), syncOut)
       << "both counts are checked before the pointers";
-  const std::string asyncIn =
-                        countMessage("ZinMOX_getPortBits", "asyncInDataBitCount", "ASYNC_INPUT"),
-                    syncIn = countMessage("ZinMOX_getPortBits", "syncInDataBitCount", "SYNC_INPUT");
+  const std::string asyncIn = countMessage(getCall, "asyncInDataBitCount", "ASYNC_INPUT"),
+                    syncIn = countMessage(getCall, "syncInDataBitCount", "SYNC_INPUT");
   std::vector<std::vector<uint8_t>> v;
   EXPECT_EQ(errorOf(get(v, kAsyncIn - 1, kSyncIn)), asyncIn);
   EXPECT_EQ(errorOf(get(v, kAsyncIn + 1, 999)), asyncIn);
@@ -210,14 +203,11 @@ TEST_F(PortBits, CountAndPointerChecksRunInOrderAndSendNothing) {
                              ones(32, 0xFF);
   ASSERT_EQ(set(first.data(), ones.data(), kAsyncOut, nullptr, nullptr, 0), 0u);
   const uint8_t *o = other.data(), *m = ones.data();
-  EXPECT_EQ(errorOf(set(nullptr, m, kAsyncOut, m, m, kSyncOut)),
-            "ZinMOX_setPortBits() arg. failed:asyncOutData!=0");
-  EXPECT_EQ(errorOf(set(o, nullptr, kAsyncOut, m, m, kSyncOut)),
-            "ZinMOX_setPortBits() arg. failed:asyncOutUpdateMask!=0");
-  EXPECT_EQ(errorOf(set(o, m, kAsyncOut, nullptr, m, kSyncOut)),
-            "ZinMOX_setPortBits() arg. failed:syncOutData!=0");
-  EXPECT_EQ(errorOf(set(o, m, kAsyncOut, m, nullptr, kSyncOut)),
-            "ZinMOX_setPortBits() arg. failed:syncOutUpdateMask!=0");
+  const std::string null = "ZinMOX_setPortBits() arg. failed:";
+  EXPECT_EQ(errorOf(set(nullptr, m, kAsyncOut, m, m, kSyncOut)), null + "asyncOutData!=0");
+  EXPECT_EQ(errorOf(set(o, nullptr, kAsyncOut, m, m, kSyncOut)), null + "asyncOutUpdateMask!=0");
+  EXPECT_EQ(errorOf(set(o, m, kAsyncOut, nullptr, m, kSyncOut)), null + "syncOutData!=0");
+  EXPECT_EQ(errorOf(set(o, m, kAsyncOut, m, nullptr, kSyncOut)), null + "syncOutUpdateMask!=0");
   EXPECT_EQ(transport->transfers().size(), 1u) << "failed calls send nothing";
   ASSERT_EQ(set(nullptr, nullptr, 0, nullptr, nullptr, 0), 0u) << "null vectors of unused ports";
   WriteImage expected = WriteImage::zeros(kAsyncOut, kSyncOut);
@@ -266,9 +256,9 @@ TEST_F(Ports, WidestPortsRoundTripBitExactly) {
   const std::vector<uint8_t> asyncData = randomBytes((asyncOut + 7) / 8),
                              asyncMask = randomBytes((asyncOut + 7) / 8),
                              steps = randomBytes(16 * syncBytes), syncMask = randomBytes(syncBytes);
-  ASSERT_EQ(ZinMOX_setPortBits(handle, &ref, asyncData.data(), asyncMask.data(), asyncOut,
-                               steps.data(), syncMask.data(), syncOut),
-            0u);
+  ASSERT_EQ(
+      set(asyncData.data(), asyncMask.data(), asyncOut, steps.data(), syncMask.data(), syncOut),
+      0u);
   const WriteImage image = lastWrite(asyncOut, syncOut);
   EXPECT_EQ(image.asyncValues, unpackBits(asyncData.data(), asyncOut));
   EXPECT_EQ(image.asyncUpdate, unpackBits(asyncMask.data(), asyncOut));

@@ -107,23 +107,24 @@ TEST_F(WriteValues, SynchronousOutputsHoldPlainValuesAndFollowPulseTrains) {
   EXPECT_EQ(image.steps[3], std::string(16, '1'));
   EXPECT_EQ(image.syncUpdate, marks(kSyncOut, p3));
   EXPECT_EQ(image.asyncUpdate, std::string(kAsyncOut, '0'));
+  image = writeOk({{"sync_out_data", "A5C3"}});  // a run of two bytes
+  for (uint32_t i = 0; i < kSyncOut; ++i) {
+    EXPECT_EQ(image.steps[i], std::string(16, ((0xA5C3u >> i) & 1u) != 0 ? '1' : '0')) << i;
+  }
 
   // 12 bits take four digits per step; of the 32 blocks of the text the 16 at the right end
   // (step 0 rightmost) are used. Spare bits of each block are set and ignored.
-  std::vector<uint32_t> stepValues;
+  const auto stepValue = [](uint32_t t) { return (t * 0x123u + 0x5Au) & 0xFFFu; };
   std::string text;
-  for (int t = 31; t >= 0; --t) {
+  for (uint32_t t = 32; t-- > 0;) {
     char block[8];
-    std::snprintf(
-        block, sizeof block, "%04X",
-        t >= 16 ? 0xABCDu : (static_cast<unsigned>(t) << 12) | ((t * 0x123u + 0x5Au) & 0xFFFu));
+    std::snprintf(block, sizeof block, "%04X", t >= 16 ? 0xABCDu : (t << 12) | stepValue(t));
     text += block;
   }
-  for (uint32_t t = 0; t < 16; ++t) stepValues.push_back((t * 0x123u + 0x5Au) & 0xFFFu);
   image = writeOk({{"p12.pulsetrain", text}, {"w16", "1234"}});
   for (uint32_t i = 0; i < 12; ++i) {
     std::string expected;
-    for (uint32_t t = 0; t < 16; ++t) expected.push_back(((stepValues[t] >> i) & 1) ? '1' : '0');
+    for (uint32_t t = 0; t < 16; ++t) expected.push_back(((stepValue(t) >> i) & 1) ? '1' : '0');
     EXPECT_EQ(image.steps[p12[i]], expected) << "value bit " << i << " on port bit " << p12[i];
   }
   EXPECT_EQ(image.syncUpdate, marks(kSyncOut, p12));
@@ -141,13 +142,10 @@ TEST_F(WriteValues, SynchronousOutputsHoldPlainValuesAndFollowPulseTrains) {
 
 TEST_F(WriteValues, OnlyTheExactPulsetrainSuffixAsksForAPulseTrain) {
   const std::string plainOne(16, '1'), trainOne = "1000000000000000";
-  const std::vector<std::pair<const char*, std::string>> cases = {{"s1", plainOne},
-                                                                  {"s1.anything", plainOne},
-                                                                  {"s1.PULSETRAIN", plainOne},
-                                                                  {"s1.b.pulsetrain", plainOne},
-                                                                  {"s1.pulsetrain", trainOne},
-                                                                  {"S1.pulsetrain", trainOne}};
-  for (const auto& [key, steps] : cases) EXPECT_EQ(writeOk({{key, "1"}}).steps[0], steps) << key;
+  for (const char* key : {"s1", "s1.anything", "s1.PULSETRAIN", "s1.b.pulsetrain"})
+    EXPECT_EQ(writeOk({{key, "1"}}).steps[0], plainOne) << key;
+  for (const char* key : {"s1.pulsetrain", "S1.pulsetrain"})
+    EXPECT_EQ(writeOk({{key, "1"}}).steps[0], trainOne) << key;
   EXPECT_EQ(writeOk({{"s1.value", "0"}}).steps[0], std::string(16, '0'));
   EXPECT_EQ(valueAt(writeOk({{"w8.PULSETRAIN", "5A"}}), w8), 0x5Au) << "a plain value";
 
@@ -179,15 +177,12 @@ TEST_F(WriteValues, AnEmptyMapSendsTheImageWithNothingMarked) {
   EXPECT_EQ(image.syncUpdate, std::string(kSyncOut, '0'));
   EXPECT_EQ(transport->flushCount(), 2u);
 
-  EXPECT_EQ(errorOf(ZinMOX_writeValues(handle, &ref, nullptr)),
-            "ZinMOX_writeValues() arg. failed:outputHashMap!=0");
-  EXPECT_EQ(errorOf(ZinMOX_readValues(handle, &ref, nullptr)),
-            "ZinMOX_readValues() arg. failed:inputHashMap!=0");
+  const std::string w = "ZinMOX_writeValues() arg. failed:", r = "ZinMOX_readValues() arg. failed:";
   uintptr_t nullWord = 0;
-  EXPECT_EQ(errorOf(ZinMOX_writeValues(handle, &ref, &nullWord)),
-            "ZinMOX_writeValues() arg. failed:*outputHashMap!=0");
-  EXPECT_EQ(errorOf(ZinMOX_readValues(handle, &ref, &nullWord)),
-            "ZinMOX_readValues() arg. failed:*inputHashMap!=0");
+  EXPECT_EQ(errorOf(ZinMOX_writeValues(handle, &ref, nullptr)), w + "outputHashMap!=0");
+  EXPECT_EQ(errorOf(ZinMOX_readValues(handle, &ref, nullptr)), r + "inputHashMap!=0");
+  EXPECT_EQ(errorOf(ZinMOX_writeValues(handle, &ref, &nullWord)), w + "*outputHashMap!=0");
+  EXPECT_EQ(errorOf(ZinMOX_readValues(handle, &ref, &nullWord)), r + "*inputHashMap!=0");
   EXPECT_EQ(transport->transfers().size(), 2u);
 }
 
@@ -215,19 +210,17 @@ TEST_F(ReadValues, ReportsEveryInputUnderItsKeysAndKeepsOtherKeys) {
   expectNoMessages();
   ZinMOX_ValueMap expected{{"unrelated", "keep"}, {"async_out_data", "7"}};
   // The hexadecimal text of the port characters at the positions (value bit i at port bit
-  // positions[i]) under each key of a signal.
+  // positions[i]) under each key of a signal, the keys in the order of the image's vectors.
   const auto add = [&](const std::string& name, bool sync, const std::vector<uint32_t>& at) {
-    const auto hexOf = [&](const std::string& port) {
+    const char* suffixes[] = {".value", ".activity_up", ".activity_down", ".sync_activity_up",
+                              ".sync_activity_down"};
+    for (int k = 0; k < (sync ? 5 : 3); ++k) {
+      const std::string& port = *image.vectors()[sync * 3 + k];
       std::string bits;
       for (std::size_t i = at.size(); i-- > 0;) bits.push_back(port[at[i]]);
-      return bitsToHex(bits);
-    };
-    expected[name] = expected[name + ".value"] = hexOf(sync ? image.syncValue : image.asyncValue);
-    expected[name + ".activity_up"] = hexOf(sync ? image.syncUp : image.asyncUp);
-    expected[name + ".activity_down"] = hexOf(sync ? image.syncDown : image.asyncDown);
-    if (!sync) return;
-    expected[name + ".sync_activity_up"] = hexOf(image.syncSyncUp);
-    expected[name + ".sync_activity_down"] = hexOf(image.syncSyncDown);
+      expected[name + suffixes[k]] = bitsToHex(bits);
+    }
+    expected[name] = expected[name + ".value"];
   };
   add("a", false, a);
   add("s", true, s);

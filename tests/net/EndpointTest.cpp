@@ -31,6 +31,8 @@ TEST(Endpoint, HostPortFormsTcpTargetsAndTheirFaults) {
   EXPECT_THROW(parseTcpTarget("tcp://127.0.0.1"), std::invalid_argument);
   EXPECT_THROW(parseTcpTarget("tcp://127.0.0.1:0"), std::invalid_argument);
   EXPECT_THROW(parseTcpTarget("tcp://"), std::invalid_argument);
+  EXPECT_FALSE(ZinNet::parseTlsTarget("tcp://127.0.0.1:7700").has_value());
+  EXPECT_EQ(ZinNet::parseTlsTarget("tls://localhost:7700")->host, "localhost");
 }
 
 }  // namespace

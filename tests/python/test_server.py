@@ -25,15 +25,21 @@ def stop(process):
     assert "stopping on SIGTERM" in process.stdout.read()
 
 
+def serve(env=None):
+    """`zinmox serve` on a free loopback port; its first lines say where and how it listens."""
+    process = subprocess.Popen([TOOL, "serve", "--listen", "127.0.0.1:0"],
+                               stdout=subprocess.PIPE, text=True, env=env)
+    process.lines = process.stdout.readline() + process.stdout.readline()  # listening, serving
+    found = re.search(r"tcp://127\.0\.0\.1:\d+", process.lines)
+    process.target = found.group(0) if found else None
+    return process
+
+
 @pytest.fixture
 def server():
-    process = subprocess.Popen([TOOL, "serve", "--listen", "127.0.0.1:0"],
-                               stdout=subprocess.PIPE, text=True)
+    process = serve()
     try:
-        lines = process.stdout.readline() + process.stdout.readline()  # listening, serving
-        found = re.search(r"tcp://127\.0\.0\.1:\d+", lines)
-        assert found and "loopback only" in lines, lines
-        process.target = found.group(0)
+        assert process.target and "loopback only" in process.lines, process.lines
         yield process
     finally:
         if process.poll() is None:
@@ -61,3 +67,16 @@ def test_sessions_and_tool_processes_share_the_served_target(server):
         zinmox.Session(server.target)
     late = tool("--target", server.target, "scan")
     assert late.returncode == 1 and "cannot connect to 127.0.0.1" in late.stderr
+
+
+def test_a_token_server_takes_the_token_keyword():
+    token = "python-token-0123456789"
+    process = serve(env=dict(os.environ, ZINMOX_TOKEN=token))
+    try:
+        assert process.target, process.lines
+        with pytest.raises(ConnectionError, match="does not know the token"):
+            zinmox.Session(process.target, token="another-token-0123456789")
+        with zinmox.Session(process.target, token=token) as session:
+            assert session.scan()
+    finally:
+        stop(process)

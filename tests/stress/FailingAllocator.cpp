@@ -7,13 +7,13 @@
 
 namespace ZinStress {
 
+std::atomic<bool> armed{false}, failed{false};
+std::atomic<int64_t> live{0};
+
 namespace {
 
-std::atomic<bool> armed{false};
 std::atomic<uint64_t> counted{0};
 std::atomic<uint64_t> failAtCount{0};
-std::atomic<bool> failed{false};
-std::atomic<int64_t> live{0};
 
 }  // namespace
 
@@ -22,18 +22,6 @@ void armAllocationFailure(uint64_t failAt) {
   failed = false;
   failAtCount = failAt;
   armed = true;
-}
-
-void disarmAllocationFailure() {
-  armed = false;
-}
-
-bool allocationFailureHappened() {
-  return failed.load();
-}
-
-int64_t liveAllocations() {
-  return live.load();
 }
 
 }  // namespace ZinStress

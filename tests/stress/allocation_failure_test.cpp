@@ -51,12 +51,9 @@ struct Recorder {
 class Scenario {
  public:
   Scenario() : transport_(std::make_shared<ZinTestKit::ScriptedTransport>()) {
-    ZinTestKit::MoxStatus status;
-    status.asyncInputCount = 12;
-    status.syncInputCount = 9;
-    status.asyncOutputCount = 10;
-    status.syncOutputCount = 7;
-    transport_->placeMoxCore(ref_, status);
+    transport_->placeMoxCore(
+        ref_,
+        {.asyncInputCount = 12, .syncInputCount = 9, .asyncOutputCount = 10, .syncOutputCount = 7});
     transport_->queueReadData(std::vector<unsigned char>(32, 0x5A));
     handle_ = ZinJtag_openSession(transport_);
     ZinJtag_setMessageHandler(handle_, &Recorder::onMessage, &recorder);
@@ -75,13 +72,8 @@ class Scenario {
          [=] {
            return ZinMOX_defineBus(h, r, "status_with_a_long_name", ZINMOX_SYNC_INPUT, inBits, 4);
          }},
-        {"writeValues",
-         [=, this] { return ZinMOX_writeValues(h, r, &(word_ = mapWord(writeMap_))); }},
-        {"readValues",
-         [=, this] {
-           readMap_.clear();
-           return ZinMOX_readValues(h, r, &(word_ = mapWord(readMap_)));
-         }},
+        {"writeValues", [=, this] { return ZinMOX_writeValues(h, r, &writeWord_); }},
+        {"readValues", [=, this] { return readMap_.clear(), ZinMOX_readValues(h, r, &readWord_); }},
         {"setPortBits",
          [=, this] { return ZinMOX_setPortBits(h, r, in_, in_ + 2, 10, in_ + 4, in_, 7); }},
         {"getPortBits",
@@ -91,10 +83,7 @@ class Scenario {
          }},
         {"getSignalSizes", [=, this] { return ZinMOX_getSignalSizes(h, r, names_, sizes_, 2, 1); }},
         {"getCoreInfo",
-         [=, this] {
-           readMap_.clear();
-           return ZinMOX_getCoreInfo(h, r, &(word_ = mapWord(readMap_)));
-         }},
+         [=, this] { return readMap_.clear(), ZinMOX_getCoreInfo(h, r, &readWord_); }},
         {"undefineName", [=] { return ZinMOX_undefineName(h, r, "ctl", ZINMOX_ASYNC_OUTPUT); }},
         {"terminateCore", [=] { return ZinMOX_terminateCore(h, r); }},
     };
@@ -111,7 +100,7 @@ class Scenario {
     EXPECT_EQ(ZinMOX_setPortBits(handle_, &ref_, in_, in_, 10, in_ + 4, in_, 7), 0u);
     ZinRT::ZinMOX_ValueMap map{{"sync_out_data", "55"}};
     EXPECT_EQ(ZinMOX_writeValues(handle_, &ref_, &(word_ = mapWord(map))), 0u);
-    EXPECT_EQ(ZinMOX_readValues(handle_, &ref_, &(word_ = mapWord(readMap_))), 0u);
+    EXPECT_EQ(ZinMOX_readValues(handle_, &ref_, &readWord_), 0u);
   }
 
   Recorder recorder;
@@ -130,7 +119,7 @@ class Scenario {
                                    {"steps.pulsetrain", "0123456789ABCDEF0123456789ABCDEF"},
                                    {"async_out_data", "3FF"}};
   ZinRT::ZinMOX_ValueMap readMap_;
-  uintptr_t word_ = 0;
+  uintptr_t word_ = 0, writeWord_ = mapWord(writeMap_), readWord_ = mapWord(readMap_);
   uint32_t sizes_[2] = {};
   const char* names_[2] = {"ctl", "steps"};
   uint8_t in_[20] = {0x5A, 0x03, 0xFF, 0x01, 1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16};
@@ -157,10 +146,10 @@ bool runWithFailureAt(uint64_t n) {
   ZinStress::armAllocationFailure(n);
   for (size_t i = 0; i < calls.size(); ++i) {
     results[i] = calls[i].second();
-    if (failedAt == calls.size() && ZinStress::allocationFailureHappened()) failedAt = i;
+    if (failedAt == calls.size() && ZinStress::failed) failedAt = i;
     messagesOf[i] = scenario.recorder.take();
   }
-  ZinStress::disarmAllocationFailure();
+  ZinStress::armed = false;
 
   for (size_t i = 0; i < calls.size(); ++i) {
     const std::vector<Message>& messages = messagesOf[i];
@@ -192,10 +181,10 @@ bool runWithFailureAt(uint64_t n) {
 
 TEST(AllocationFailure, EveryAllocationOfACallSequenceMayFail) {
   runWithFailureAt(0);  // warm-up: the framework's registries make their one-time allocations
-  const int64_t liveBefore = ZinStress::liveAllocations();
+  const int64_t liveBefore = ZinStress::live.load();
   uint64_t n = 1;
   for (; n < 100000 && !::testing::Test::HasFailure() && runWithFailureAt(n); ++n) {
-    ASSERT_EQ(ZinStress::liveAllocations(), liveBefore) << "allocations leaked with N=" << n;
+    ASSERT_EQ(ZinStress::live.load(), liveBefore) << "allocations leaked with N=" << n;
   }
   EXPECT_GT(n, 50u) << "the sequence makes allocations to fail";
   RecordProperty("sequence_allocations", static_cast<int>(n - 1));

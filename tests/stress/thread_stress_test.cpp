@@ -35,9 +35,8 @@ void recordOnThisThread(void*, uint32_t handle, uint32_t code, const char* text)
 // A scripted target with a 16/12/16/12 MOX core at each of `refs`.
 std::shared_ptr<ZinTestKit::ScriptedTransport> moxTarget(const std::vector<ZIN_CORE_REF>& refs) {
   auto transport = std::make_shared<ZinTestKit::ScriptedTransport>();
-  ZinTestKit::MoxStatus status;
-  status.asyncInputCount = status.asyncOutputCount = 16;
-  status.syncInputCount = status.syncOutputCount = 12;
+  const ZinTestKit::MoxStatus status{
+      .asyncInputCount = 16, .syncInputCount = 12, .asyncOutputCount = 16, .syncOutputCount = 12};
   for (const ZIN_CORE_REF& ref : refs) transport->placeMoxCore(ref, status);
   return transport;
 }
@@ -99,36 +98,35 @@ class Worker {
     ZinRT::ZinMOX_ValueMap map;
     uintptr_t word = reinterpret_cast<uintptr_t>(&map);
     uint8_t data[8][2] = {};
+    const uint32_t h = handle_;
+    ZIN_CORE_REF* r = &ref_;
     const uint8_t steps[16 * 2] = {};  // sixteen step vectors of twelve bits
     if (pick < 15) {
-      check("define",
-            ZinMOX_defineSignal(handle_, &ref_, name.c_str(), ZINMOX_ASYNC_OUTPUT, next() % 16));
+      check("define", ZinMOX_defineSignal(h, r, name.c_str(), ZINMOX_ASYNC_OUTPUT, next() % 16));
     } else if (pick < 25) {
       const uint32_t bits[3] = {next() % 12, next() % 12, next() % 12};
-      check("defineBus",
-            ZinMOX_defineBus(handle_, &ref_, (name + "in").c_str(), ZINMOX_SYNC_INPUT, bits, 3));
+      check("defineBus", ZinMOX_defineBus(h, r, (name + "in").c_str(), ZINMOX_SYNC_INPUT, bits, 3));
     } else if (pick < 45) {
       map[name] = next() % 2 != 0 ? "1" : "0";
-      check("writeValues", ZinMOX_writeValues(handle_, &ref_, &word));
+      check("writeValues", ZinMOX_writeValues(h, r, &word));
     } else if (pick < 55) {
       map[tag_ + "missing"] = "1";
-      const uint32_t result = ZinMOX_writeValues(handle_, &ref_, &word);
+      const uint32_t result = ZinMOX_writeValues(h, r, &word);
       if (result == 0) problems.push_back(tag_ + " write of an unknown name succeeded");
       check("write(missing)", result, "Could not find a signal with the name: " + tag_ + "missing");
     } else if (pick < 70) {
-      check("readValues", ZinMOX_readValues(handle_, &ref_, &word));
+      check("readValues", ZinMOX_readValues(h, r, &word));
     } else if (pick < 78) {
-      check("setPortBits",
-            ZinMOX_setPortBits(handle_, &ref_, data[0], data[1], 16, steps, data[3], 12));
+      check("setPortBits", ZinMOX_setPortBits(h, r, data[0], data[1], 16, steps, data[3], 12));
     } else if (pick < 86) {
-      check("getPortBits", ZinMOX_getPortBits(handle_, &ref_, data[0], data[1], data[2], 16,
-                                              data[3], data[4], data[5], data[6], data[7], 12));
+      check("getPortBits", ZinMOX_getPortBits(h, r, data[0], data[1], data[2], 16, data[3], data[4],
+                                              data[5], data[6], data[7], 12));
     } else if (pick < 94) {
-      check("undefineName", ZinMOX_undefineName(handle_, &ref_, name.c_str(), ZINMOX_ASYNC_OUTPUT));
+      check("undefineName", ZinMOX_undefineName(h, r, name.c_str(), ZINMOX_ASYNC_OUTPUT));
     } else if (pick < 97) {
-      check("terminateCore", ZinMOX_terminateCore(handle_, &ref_));
+      check("terminateCore", ZinMOX_terminateCore(h, r));
     } else {
-      check("initCore", ZinMOX_initCore(handle_, &ref_));
+      check("initCore", ZinMOX_initCore(h, r));
     }
   }
 

@@ -42,26 +42,21 @@ sockaddr_in loopback(int port) {
 }
 
 // A folder of this test process, removed when the process ends.
-class TempFolder {
- public:
-  TempFolder() {
-    std::string pattern = (std::filesystem::temp_directory_path() / "zinmox_test_XXXXXX").string();
-    if (mkdtemp(pattern.data()) == nullptr) throw std::runtime_error("mkdtemp failed");
-    path_ = pattern;
-  }
-  ~TempFolder() {
-    std::error_code ignored;
-    std::filesystem::remove_all(path_, ignored);
-  }
-  const std::filesystem::path& path() const { return path_; }
-
- private:
-  std::filesystem::path path_;
-};
-
 const std::filesystem::path& tempFolder() {
-  static const TempFolder folder;
-  return folder.path();
+  static const struct Folder {
+    std::filesystem::path path;
+    Folder() {
+      std::string pattern =
+          (std::filesystem::temp_directory_path() / "zinmox_test_XXXXXX").string();
+      if (mkdtemp(pattern.data()) == nullptr) throw std::runtime_error("mkdtemp failed");
+      path = pattern;
+    }
+    ~Folder() {
+      std::error_code ignored;
+      std::filesystem::remove_all(path, ignored);
+    }
+  } folder;
+  return folder.path;
 }
 
 std::string readFile(const std::string& path) {
@@ -121,12 +116,10 @@ ProcessResult runProcess(const std::string& path, const std::vector<std::string>
   if (pid < 0) throw std::runtime_error("cannot start " + path);
   const int status = reap(pid, Clock::now() + std::chrono::milliseconds(timeoutMs),
                           [] { std::this_thread::sleep_for(std::chrono::milliseconds(5)); });
-  ProcessResult result;
-  if (status == -1) result.signal = SIGKILL;
-  if (status != -1 && WIFEXITED(status)) result.status = WEXITSTATUS(status);
-  if (status != -1 && WIFSIGNALED(status)) result.signal = WTERMSIG(status);
-  result.out = readFile(out);
-  result.err = readFile(err);
+  ProcessResult result{-1, SIGKILL, readFile(out), readFile(err)};
+  if (status == -1) return result;
+  result.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+  result.signal = WIFSIGNALED(status) ? WTERMSIG(status) : 0;
   return result;
 }
 

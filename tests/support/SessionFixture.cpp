@@ -59,15 +59,9 @@ std::string SessionFixture::errorOf(uint32_t result) {
 }
 
 void SessionFixture::expectWrongCoreType(const std::string& text) {
-  const std::vector<RecordedMessage> recorded = messages();
+  EXPECT_EQ(messages(), (std::vector<RecordedMessage>{{kErrorCode, text, true},
+                                                      {kAbortCode, "Zin abort command", false}}));
   clearMessages();
-  ASSERT_EQ(recorded.size(), 2u);
-  EXPECT_EQ(recorded[0].code, kErrorCode);
-  EXPECT_EQ(recorded[0].text, text);
-  EXPECT_TRUE(recorded[0].lockHeld);
-  EXPECT_EQ(recorded[1].code, kAbortCode);
-  EXPECT_EQ(recorded[1].text, "Zin abort command");
-  EXPECT_FALSE(recorded[1].lockHeld);
 }
 
 void SessionFixture::expectNoMessages() {
@@ -78,12 +72,10 @@ void SessionFixture::expectNoMessages() {
 ZinRT::ZinMOX_Core* SessionFixture::initMoxCore(const ZIN_CORE_REF& coreRef, uint32_t asyncIn,
                                                 uint32_t syncIn, uint32_t asyncOut,
                                                 uint32_t syncOut) {
-  ZinTestKit::MoxStatus status;
-  status.asyncInputCount = asyncIn;
-  status.syncInputCount = syncIn;
-  status.asyncOutputCount = asyncOut;
-  status.syncOutputCount = syncOut;
-  transport->placeMoxCore(coreRef, status);
+  transport->placeMoxCore(coreRef, {.asyncInputCount = asyncIn,
+                                    .syncInputCount = syncIn,
+                                    .asyncOutputCount = asyncOut,
+                                    .syncOutputCount = syncOut});
   ZIN_CORE_REF copy = coreRef;
   EXPECT_EQ(ZinMOX_initCore(handle, &copy), 0u) << "ZinMOX_initCore failed";
   ZinRT::ZinMOX_Core* core = registeredCore(coreRef);

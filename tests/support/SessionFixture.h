@@ -24,6 +24,7 @@ struct RecordedMessage {
   uint32_t code;
   std::string text;
   bool lockHeld;
+  bool operator==(const RecordedMessage&) const = default;
 };
 
 inline constexpr uint32_t kFailure = 0x80000000u;

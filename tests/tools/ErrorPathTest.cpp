@@ -47,6 +47,10 @@ TEST(ErrorPaths, UsageErrorsExitWithTwoAndAHint) {
       {{"ports", "0:1:3", "write", "--async", "1"}, 1, "wrong core type"},
       {{"--target", "x.json", "demo"}, 2, "leave out --target"},
       {{"serve", "--listen", "127.0.0.1"}, 2, "missing ':PORT'"},
+      {{"serve", "--listen", "0.0.0.0:0"}, 1, "refusing to listen on 0.0.0.0:0 without a token"},
+      {{"--token-file", "/nonexistent/token", "scan"}, 2, "cannot read the token file"},
+      {{"--token-file", writeTempFile("short_token", "short\n"), "serve"}, 2, "has 5 bytes"},
+      {{"serve", "--tls-cert", "cert.pem"}, 2, "--tls-cert and --tls-key go together"},
   };
   for (const ErrorCase& c : cases) expectError(c);
   const auto hinted = runTool({"read", "1:2"});

@@ -3,6 +3,7 @@
 
 #include "Errors.h"
 #include "ZinMOX/ZinMOX_Version.h"
+#include "ZinNet/Token.h"
 
 namespace zinmox {
 
@@ -37,8 +38,27 @@ std::unique_ptr<CLI::App> buildApp(Session& session, bool forScript) {
     app->add_option_function<std::string>(
            "--target",
            [&session](const std::string& targetText) { session.setTargetText(targetText); },
-           "JSON description of a simulated target, or tcp://HOST:PORT of a target server "
-           "(default: the built-in demo design)")
+           "JSON description of a simulated target, or tcp://HOST:PORT (tls://HOST:PORT over "
+           "TLS) of a target server (default: the built-in demo design)")
+        ->type_name("FILE");
+    app->add_option_function<std::string>(
+           "--token-file",
+           [&session](const std::string& path) {
+             try {
+               session.serverAccess().token = ZinNet::readTokenFile(path);
+             } catch (const std::invalid_argument& error) {
+               throw UsageError(error.what());
+             }
+           },
+           std::string("File holding the token that a target server (and serve) requires; "
+                       "without it the ") +
+               ZinNet::kTokenVariable + " variable is used when set")
+        ->type_name("FILE");
+    app->add_option_function<std::string>(
+           "--tls-ca",
+           [&session](const std::string& path) { session.serverAccess().tlsCaFile = path; },
+           "PEM file of the certificate authorities that tls:// targets are checked against "
+           "(default: the system's)")
         ->type_name("FILE");
     app->set_version_flag("--version", std::string("zinmox ") + ZINMOX_VERSION_STRING);
   }

@@ -62,7 +62,7 @@ void Session::setTargetText(const std::string& targetText) {
 
 uint32_t Session::handle() {
   if (handle_ != 0) return handle_;
-  transport_ = ZinHost::openTarget(targetText_).transport;
+  transport_ = ZinHost::openTarget(targetText_, access_).transport;
   handle_ = ZinJtag_openSession(transport_);
   ZinJtag_setMessageHandler(handle_, &Session::onMessage, this);
   return handle_;

@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "ZinHost/Signals.h"
+#include "ZinHost/Target.h"
 #include "ZinMOX/ZinMOX.h"
 #include "ZinRT/ZinCore_Types.h"
 #include "ZinRT/Zin_Transport.h"
@@ -29,6 +30,8 @@ class Session {
   /// Where the target comes from; may change only before the session is opened.
   void setTargetText(const std::string& targetText);
   const std::string& targetText() const { return targetText_; }
+  /// The token and certificate authorities for a target server (and for `serve` itself).
+  ZinHost::ServerAccess& serverAccess() { return access_; }
 
   /// The session handle; opens the target and the session on first use.
   uint32_t handle();
@@ -73,6 +76,7 @@ class Session {
   };
 
   std::string targetText_;
+  ZinHost::ServerAccess access_;
   std::shared_ptr<ZinRT::Zin_Transport> transport_;
   uint32_t handle_ = 0;
   uint64_t messageCount_ = 0;

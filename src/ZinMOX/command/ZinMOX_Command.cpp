@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <array>
 #include <cstring>
+#include <iterator>
 #include <memory>
 #include <stdexcept>
 
@@ -61,6 +62,11 @@ void appendLine(std::string& text, const ZIN_CORE_REF& ref, uint32_t code, char 
   text += data;
 }
 
+// '1' or '0' for bit `bit` of packed data.
+char bitChar(const unsigned char* data, uint32_t bit) {
+  return ((data[bit / 8] >> (bit % 8)) & 1u) != 0 ? '1' : '0';
+}
+
 bool sameRef(const ZIN_CORE_REF& a, const ZIN_CORE_REF& b) {
   return a.deviceIndex == b.deviceIndex && a.userChainNumber == b.userChainNumber &&
          a.coreIndex == b.coreIndex;
@@ -106,13 +112,6 @@ void ZinMOX_Command::stageAsyncRun(uint32_t first, const uint8_t* value, uint32_
   for (; i + 8 <= n; i += 8) std::memcpy(chars + i, mox::kByteBitsLsbFirst[value[i / 8]].data(), 8);
   for (; i < n; ++i) chars[i] = ((value[i / 8] >> (i % 8)) & 1u) != 0 ? '1' : '0';
   std::memset(asyncOutUpdateBits.data() + first, '1', n);
-}
-
-void ZinMOX_Command::holdPulseTrainRun(uint32_t first, const uint8_t* value, uint32_t n) {
-  for (uint32_t i = 0; i < n; ++i) {
-    holdPulseTrain(first + i, ((value[i / 8] >> (i % 8)) & 1u) != 0 ? '1' : '0');
-  }
-  std::memset(syncOutUpdateBits.data() + first, '1', n);
 }
 
 std::string& ZinMOX_Command::buildCommandText(const ZIN_CORE_REF& coreRef, uint32_t code,
@@ -203,42 +202,57 @@ void ZinMOX_Command::readInputs(uint32_t handle, const ZIN_CORE_REF& coreRef) {
     readLines_.valid = true;
   }
   const uint32_t readBits = readLines_.readBits;
-  readData_.resize(mox::byteCount(readBits));
+  readData_.resize(mox::byteCount(readBits) + READ_DATA_SLACK);
   Zin_CoreComm::commandSequence(handle, readLines_.text, readData_.data(), readBits, nullptr);
-
-  const uint32_t inputBits = ASYNC_IN_BITS * aIn + SYNC_IN_BITS * sIn;
-  std::string& bits = readBitText_;
-  mox::msbFirstBitText(readData_.data(), inputBits, bits);
-  const uint32_t asyncBits = inputBits - SYNC_IN_BITS * sIn;
-  if (sIn != 0) unpackSyncInputs(bits.c_str() + asyncBits);
-  if (aIn != 0) unpackAsyncInputs(bits.c_str());
+  if (sIn != 0) unpackSyncInputs(readData_.data());
+  if (aIn != 0) unpackAsyncInputs(readData_.data());
 }
 
-void ZinMOX_Command::unpackAsyncInputs(const char* bits) {
-  const uint32_t count = moxCoreInfo.async_input_count;
-  char* value = asyncInValueBits.data();
-  char* up = asyncInActivityUpBits.data();
-  char* down = asyncInActivityDownBits.data();
-  for (uint32_t i = 0; i < count; ++i, bits += ASYNC_IN_BITS) {
-    value[i] = bits[0];
-    up[i] = bits[1];
-    down[i] = bits[2];
+// The read line carries the inputs last bit first: read from its end, the packed data hold the
+// synchronous inputs from bit 0, the last input lowest, then the asynchronous ones likewise.
+// Input i's fields (value first) are the top bits of its group of bits, most significant first.
+// Eight inputs at a time, each field's eight bits are gathered into a byte whose bit text (most
+// significant bit first) is the eight characters of inputs i to i+7.
+
+void ZinMOX_Command::unpackSyncInputs(const unsigned char* data) {
+  const uint32_t count = moxCoreInfo.sync_input_count;
+  char* const fields[] = {syncInValueBits.data(), syncInActivityUpBits.data(),
+                          syncInActivityDownBits.data(), syncInSyncActivityUpBits.data(),
+                          syncInSyncActivityDownBits.data()};
+  constexpr uint32_t top = SYNC_IN_BITS - 1;  // the bit of field 0 within an input's group
+  uint32_t i = 0;
+  for (; i + 8 <= count; i += 8) {
+    const uint32_t first = SYNC_IN_BITS * (count - 8 - i);  // the lowest bit of inputs i..i+7
+    const uint64_t word = mox::loadPacked(data + first / 8) >> (first % 8);
+    for (uint32_t k = 0; k < std::size(fields); ++k) {
+      const unsigned byte = mox::gatherEverySixth(word >> (top - k));
+      std::memcpy(fields[k] + i, mox::kByteBitsMsbFirst[byte].data(), 8);
+    }
+  }
+  for (; i < count; ++i) {
+    const uint32_t first = SYNC_IN_BITS * (count - 1 - i);
+    for (uint32_t k = 0; k < std::size(fields); ++k) fields[k][i] = bitChar(data, first + top - k);
   }
 }
 
-void ZinMOX_Command::unpackSyncInputs(const char* bits) {
-  const uint32_t count = moxCoreInfo.sync_input_count;
-  char* value = syncInValueBits.data();
-  char* up = syncInActivityUpBits.data();
-  char* down = syncInActivityDownBits.data();
-  char* syncUp = syncInSyncActivityUpBits.data();
-  char* syncDown = syncInSyncActivityDownBits.data();
-  for (uint32_t i = 0; i < count; ++i, bits += SYNC_IN_BITS) {
-    value[i] = bits[0];
-    up[i] = bits[1];
-    down[i] = bits[2];
-    syncUp[i] = bits[3];
-    syncDown[i] = bits[4];
+void ZinMOX_Command::unpackAsyncInputs(const unsigned char* data) {
+  const uint32_t count = moxCoreInfo.async_input_count;
+  char* const fields[] = {asyncInValueBits.data(), asyncInActivityUpBits.data(),
+                          asyncInActivityDownBits.data()};
+  constexpr uint32_t top = ASYNC_IN_BITS - 1;
+  const uint32_t base = SYNC_IN_BITS * moxCoreInfo.sync_input_count;
+  uint32_t i = 0;
+  for (; i + 8 <= count; i += 8) {
+    const uint32_t first = base + ASYNC_IN_BITS * (count - 8 - i);
+    const uint64_t word = mox::loadPacked(data + first / 8) >> (first % 8);
+    for (uint32_t k = 0; k < std::size(fields); ++k) {
+      const unsigned byte = mox::gatherEveryFourth(word >> (top - k));
+      std::memcpy(fields[k] + i, mox::kByteBitsMsbFirst[byte].data(), 8);
+    }
+  }
+  for (; i < count; ++i) {
+    const uint32_t first = base + ASYNC_IN_BITS * (count - 1 - i);
+    for (uint32_t k = 0; k < std::size(fields); ++k) fields[k][i] = bitChar(data, first + top - k);
   }
 }
 

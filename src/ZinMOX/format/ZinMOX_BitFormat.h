@@ -117,17 +117,24 @@ inline unsigned bitWordMsbFirst(uint64_t word) {
   return static_cast<unsigned>(((word & 0x0101010101010101ull) * 0x8040201008040201ull) >> 56);
 }
 
-/// The bit text of the `n` least significant bits of a packed vector (bit i in bit i mod 8 of
-/// byte i/8), read as a number most significant bit first: character j is bit n-1-j.
-inline void msbFirstBitText(const unsigned char* data, uint32_t n, std::string& bits) {
-  bits.resize(n);
-  char* out = bits.data();
-  const uint32_t whole = n / 8;
-  const uint32_t rest = n % 8;
-  for (uint32_t q = 0; q < whole; ++q) {
-    std::memcpy(out + (n - 8 - 8 * q), kByteBitsMsbFirst[data[q]].data(), 8);
-  }
-  if (rest != 0) std::memcpy(out, kByteBitsMsbFirst[data[whole]].data() + (8 - rest), rest);
+/// Eight bytes of packed data as one word, the first byte least significant on every machine.
+inline uint64_t loadPacked(const unsigned char* data) {
+  return loadWord(reinterpret_cast<const char*>(data));
+}
+
+/// Bits 0, 6, 12, ..., 42 of `word` as bits 0 to 7 of a byte. One product moves every bit to its
+/// place: the masked bits times 2^0 + 2^5 + 2^10 + 2^15 put bit 6m of each half at 15 + m (low
+/// half) or 39 + m - 4 (high half), and no two other partial products meet, so nothing carries.
+inline unsigned gatherEverySixth(uint64_t word) {
+  const uint64_t product = (word & 0x041041041041ull) * 0x8421u;
+  return static_cast<unsigned>(((product >> 15) & 0x0Fu) | ((product >> 35) & 0xF0u));
+}
+
+/// Bits 0, 4, 8, ..., 28 of `word` as bits 0 to 7 of a byte, in the same way (factors 2^0 + 2^3 +
+/// 2^6 + 2^9: bit 4m lands on 9 + m or 21 + m).
+inline unsigned gatherEveryFourth(uint64_t word) {
+  const uint64_t product = (word & 0x11111111ull) * 0x249u;
+  return static_cast<unsigned>(((product >> 9) & 0x0Fu) | ((product >> 21) & 0xF0u));
 }
 
 /// A byte whose bit k is 1 exactly where character k of `word` is '1' (the first character is
@@ -159,7 +166,23 @@ inline void packedHexText(const unsigned char* data, uint32_t n, std::string& te
   text.resize(digits);
   char* end = text.data() + digits;
   const uint32_t whole = digits / 2;
-  for (uint32_t q = 0; q < whole; ++q) std::memcpy(end - 2 * q - 2, kByteDigits[data[q]].data(), 2);
+  uint32_t q = 0;
+#if defined(__SSE2__)
+  // Eight bytes give sixteen digits at once: byte-swapped, the last of them comes first; its
+  // high and low nibbles are interleaved and turned into digits together.
+  for (; whole - q >= 8; q += 8) {
+    const auto word = static_cast<long long>(__builtin_bswap64(loadPacked(data + q)));
+    const __m128i bytes = _mm_set_epi64x(0, word);
+    const __m128i mask = _mm_set1_epi8(0x0F);
+    const __m128i nibbles = _mm_unpacklo_epi8(_mm_and_si128(_mm_srli_epi16(bytes, 4), mask),
+                                              _mm_and_si128(bytes, mask));
+    const __m128i letters =
+        _mm_and_si128(_mm_cmpgt_epi8(nibbles, _mm_set1_epi8(9)), _mm_set1_epi8('A' - '0' - 10));
+    const __m128i chars = _mm_add_epi8(_mm_add_epi8(nibbles, _mm_set1_epi8('0')), letters);
+    _mm_storeu_si128(reinterpret_cast<__m128i*>(end - 2 * q - 16), chars);
+  }
+#endif
+  for (; q < whole; ++q) std::memcpy(end - 2 * q - 2, kByteDigits[data[q]].data(), 2);
   if (digits % 2 != 0) text[0] = kHexDigits[data[whole] & 0x0Fu];
   if (n % 4 != 0) text[0] = kHexDigits[hexDigitValue(text[0]) & ((1u << (n % 4)) - 1)];
 }
@@ -170,6 +193,14 @@ inline constexpr std::array<uint8_t, 256> kReversedBits = [] {
   for (unsigned b = 0; b < 256; ++b) {
     for (unsigned k = 0; k < 8; ++k) table[b] |= static_cast<uint8_t>(((b >> k) & 1u) << (7 - k));
   }
+  return table;
+}();
+
+/// The two digits of eight bit characters by the byte of their ones (bit k for character k): the
+/// first character is the top bit of the first digit.
+inline constexpr auto kFirstBitHighDigits = [] {
+  std::array<std::array<char, 2>, 256> table{};
+  for (unsigned b = 0; b < 256; ++b) table[b] = kByteDigits[kReversedBits[b]];
   return table;
 }();
 
@@ -194,15 +225,24 @@ class HexTextWriter {
     const char* end = p + bits.size();
     if ((pending_ + bits.size()) / 4 > static_cast<size_t>(end_ - next_)) return false;
 #if defined(__SSE2__)
-    for (; end - p >= 16; p += 16) {
-      const __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
-      const __m128i bitChars = _mm_cmpeq_epi8(_mm_and_si128(v, _mm_set1_epi8('\xFE')),
-                                              _mm_set1_epi8('0'));  // '0' and '1' only
-      if (_mm_movemask_epi8(bitChars) != 0xFFFF) return false;
-      const auto ones =
-          static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(v, _mm_set1_epi8('1'))));
-      pushByte(kReversedBits[ones & 0xFF]);  // character k is bit k: the first is the top bit
-      pushByte(kReversedBits[ones >> 8]);
+    if (end - p >= 32) {
+      // At most three single characters complete the pending digit; from there on, sixteen
+      // characters are four whole digits, two for each byte of their ones.
+      for (; pending_ != 0; ++p) {
+        if (*p != '0' && *p != '1') return false;
+        pushBit(*p == '1' ? 1u : 0u);
+      }
+      for (; end - p >= 16; p += 16) {
+        const __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
+        const __m128i bitChars = _mm_cmpeq_epi8(_mm_and_si128(v, _mm_set1_epi8('\xFE')),
+                                                _mm_set1_epi8('0'));  // '0' and '1' only
+        if (_mm_movemask_epi8(bitChars) != 0xFFFF) return false;
+        const auto ones =
+            static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(v, _mm_set1_epi8('1'))));
+        std::memcpy(next_, kFirstBitHighDigits[ones & 0xFF].data(), 2);
+        std::memcpy(next_ + 2, kFirstBitHighDigits[ones >> 8].data(), 2);
+        next_ += 4;
+      }
     }
 #endif
     for (; end - p >= 8; p += 8) {

@@ -37,9 +37,12 @@ class ZinMOX_Command {
   /// given, receives the bits that the text reads back.
   std::string& buildCommandText(const ZIN_CORE_REF& coreRef, uint32_t code, std::string& text,
                                 uint32_t* readBitCount) const;
-  /// Copies value and activity characters of the input bits out of the read bit text.
-  void unpackAsyncInputs(const char* bits);
-  void unpackSyncInputs(const char* bits);
+  /// Sets the value and activity characters of the input bits from the packed read data (the
+  /// input bits of the read line, its last bit in bit 0). Reads whole words: the data must hold
+  /// READ_DATA_SLACK bytes past the line's.
+  void unpackAsyncInputs(const unsigned char* data);
+  void unpackSyncInputs(const unsigned char* data);
+  static constexpr uint32_t READ_DATA_SLACK = 8;
 
   void setAsyncOutValueBits(std::string bits) { asyncOutValueBits = std::move(bits); }
   void setAsyncOutUpdateBits(std::string bits) { asyncOutUpdateBits = std::move(bits); }
@@ -68,8 +71,13 @@ class ZinMOX_Command {
   void setStepVectors(const uint8_t* vectors, uint32_t count);
   /// Sets the step strings of `count` synchronous outputs from 16 packed step vectors given one
   /// by one (`vectors[t]` is step t, bit i of it for value bit i): character t of the string of
-  /// output positions[i] (of output i when `positions` is null) is bit i of vector t.
-  void stageStepVectors(const uint8_t* const* vectors, const uint32_t* positions, uint32_t count);
+  /// output positions[i] (of output first+i when `positions` is null) is bit i of vector t.
+  void stageStepVectors(const uint8_t* const* vectors, const uint32_t* positions, uint32_t first,
+                        uint32_t count);
+  /// Marks the synchronous outputs first to first+n-1 for update.
+  void markSyncOutRun(uint32_t first, uint32_t n) {
+    std::memset(syncOutUpdateBits.data() + first, '1', n);
+  }
   /// Stages value bits 0 to n-1 of a packed vector on the asynchronous outputs first to
   /// first+n-1, each with its update mark (a run of consecutive port bits).
   void stageAsyncRun(uint32_t first, const uint8_t* value, uint32_t n);
@@ -173,7 +181,6 @@ class ZinMOX_Command {
   RenderedLines readLines_;
   std::string writeText_;
   std::vector<unsigned char> readData_;
-  std::string readBitText_;
 };
 
 }  // namespace ZinRT

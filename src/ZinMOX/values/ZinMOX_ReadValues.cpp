@@ -68,10 +68,8 @@ void ZinMOX_Core::readValues(uint32_t handle, ZIN_CORE_REF coreRef, ZinMOX_Value
     throw std::logic_error("ZinMOX_Core::readValues() arg. failed:inputHashMap!=0");
   }
   parts->command.readInputs(handle, coreRef);
-  std::string key;               // the suffixed keys are built in one string
-  std::vector<uint8_t> vectors;  // and the packed vectors of every signal in one buffer
   for (const auto& entry : parts->inputSignals) {
-    reportSignal(*entry.second, *inputHashMap, key, vectors);
+    reportSignal(*entry.second, *inputHashMap, parts->readKey, parts->readVectors);
   }
 }
 

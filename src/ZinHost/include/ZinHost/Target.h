@@ -2,6 +2,7 @@
 //
 //   ""                  the built-in simulated demo design
 //   "tcp://HOST:PORT"   a target server (zinmox serve), connected at once
+//   "tls://HOST:PORT"   the same over TLS; the server's certificate is checked
 //   "openocd://HOST:PORT[?board=B][&timeout=MS]"  a board behind OpenOCD's Tcl port, connected
 //                       and checked against the board description (docs/hardware.md) at once
 //   "SCHEME://..."      any other scheme is refused until a transport for it is added
@@ -41,8 +42,16 @@ class TargetError : public std::runtime_error {
   Kind kind_;
 };
 
+/// How to reach a target server beyond its address.
+struct ServerAccess {
+  /// The token to prove; empty takes the ZINMOX_TOKEN variable when it is set.
+  std::string token;
+  /// PEM file of the certificate authorities that "tls://" trusts; empty: the system's.
+  std::string tlsCaFile;
+};
+
 /// Opens the target that `text` names. Throws TargetError.
-OpenedTarget openTarget(const std::string& text);
+OpenedTarget openTarget(const std::string& text, const ServerAccess& access = {});
 
 /// Opens a simulated target built from a description held in memory. Throws TargetError
 /// (Unusable) naming `origin` when the description has a problem.
