@@ -166,28 +166,24 @@ TEST_F(ModelTest, PulseTrainPlaysSixteenStepsAfterTheCommitAndHoldsTheLast) {
 TEST_F(ModelTest, SyncInputsSampleOnTheClockAndLatchSampleChanges) {
   target->setCyclesPerSequence(0);
   target->setInputSource(kRef, InputPort::Sync, 2, InputSource::loopback(OutputPort::Async, 3));
+  // Sync input 2 as value, activity up and down, sync activity up and down.
+  auto input2 = [&] {
+    const ZinTest::InputImage in = read();
+    return std::string{in.syncValue[2], in.syncUp[2], in.syncDown[2], in.syncSyncUp[2],
+                       in.syncSyncDown[2]};
+  };
   write(asyncImage("0001", "0001"));
-  ZinTest::InputImage in = read();
-  EXPECT_EQ(in.syncValue[2], '0') << "not sampled before a clock edge";
-  EXPECT_EQ(in.syncUp[2], '1') << "the level change is seen at once";
-  EXPECT_EQ(in.syncSyncUp[2], '0');
+  EXPECT_EQ(input2(), "01000") << "a level change is seen at once, sampled at a clock edge";
   // A pulse within one cycle: level activity, but no sample ever changes.
   write(asyncImage("0000", "0001"));
   target->advance(1);
-  in = read();
-  EXPECT_EQ(in.syncValue[2], '0');
-  EXPECT_EQ(in.syncDown[2], '1');
-  EXPECT_EQ(in.syncSyncUp[2], '0');
-  EXPECT_EQ(in.syncSyncDown[2], '0');
+  EXPECT_EQ(input2(), "00100");
   // A pulse over a clock edge is sampled: sync activity in both directions.
   write(asyncImage("0001", "0001"));
   target->advance(1);
   write(asyncImage("0000", "0001"));
   target->advance(1);
-  in = read();
-  EXPECT_EQ(in.syncValue[2], '0');
-  EXPECT_EQ(in.syncSyncUp[2], '1');
-  EXPECT_EQ(in.syncSyncDown[2], '1');
+  EXPECT_EQ(input2(), "01111");
 }
 
 TEST_F(ModelTest, ConstantCounterAndSquareSources) {
