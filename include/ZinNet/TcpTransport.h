@@ -61,16 +61,27 @@ class ZINNET_API TcpTransport : public ZinRT::Zin_Transport {
   std::string serverName() const;
   /// "HOST:PORT" of the server.
   std::string serverText() const;
+  /// The protocol version agreed with the server (0 before the first connection).
+  uint16_t protocolVersion() const;
+  /// One round trip to the server that does not touch the target (version 2 servers; a
+  /// version 1 server throws NetError). Connects first unless connected.
+  void ping();
 
   void readStatus(const ZIN_CORE_REF& ref, ZIN_CORE_INFO& info, unsigned char* status,
                   uint32_t statusBytes, uint32_t statusBitCount) override;
   void commandSequence(const std::string& text, unsigned char* readData,
                        uint32_t readBitCount) override;
   void flush() override;
+  /// One request to a version 2 server; a command sequence and a flush to a version 1 server.
+  void commandSequenceThenFlush(const std::string& text, unsigned char* readData,
+                                uint32_t readBitCount) override;
   bool listCores(std::vector<ZIN_CORE_REF>& refs) override;
 
  private:
   struct Impl;
+  void sendSequence(uint8_t type, const std::string& text, unsigned char* readData,
+                    uint32_t readBitCount);
+  void flushLocked();
   mutable std::mutex mutex_;
   std::unique_ptr<Impl> impl_;
 };

@@ -22,7 +22,7 @@ namespace ZinRT {
 ///   session message. An operation that throws must leave the target as it was before the
 ///   operation wherever the target allows it.
 /// - Order: status reads and command sequences come in any order; `flush` follows each output
-///   write sequence.
+///   write sequence (`commandSequenceThenFlush` carries both).
 class Zin_Transport {
  public:
   virtual ~Zin_Transport() = default;
@@ -43,6 +43,15 @@ class Zin_Transport {
 
   /// Makes every earlier command take effect on the target.
   virtual void flush() = 0;
+
+  /// An output write: `commandSequence`, then `flush` once the sequence has completed. A
+  /// transport that can carry both in one exchange (a remote target) overrides it; whatever it
+  /// throws must be what the two calls would have thrown.
+  virtual void commandSequenceThenFlush(const std::string& text, unsigned char* readData,
+                                        uint32_t readBitCount) {
+    commandSequence(text, readData, readBitCount);
+    flush();
+  }
 
   /// Optional: appends to `refs` the references where a core answers a status read and returns
   /// true; a transport that cannot enumerate returns false (the default).

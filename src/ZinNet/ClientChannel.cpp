@@ -92,49 +92,60 @@ void ClientChannel::connectNow() {
   if (resolved->ec) {
     fail("ZinNet: cannot find the server host " + endpoint_.host + ": " + resolved->ec.message());
   }
-  auto connected = std::make_shared<OpState>();
-  asio::async_connect(socket_, resolved->results, [connected](std::error_code ec, tcp::endpoint) {
-    connected->done = true;
-    connected->ec = ec;
-  });
-  await(connected, deadline, what, ms);
-  if (connected->ec) {
-    fail("ZinNet: cannot connect to " + endpoint_.text() + ": " + connected->ec.message() +
-         " (is `zinmox serve` running there?)");
+  // Ask for the newest version; a server that only speaks the oldest refuses it with a closing
+  // frame ("protocol version 2 is not supported; ..."), and is greeted again with the oldest.
+  for (uint16_t version = Protocol::kVersion;; version = Protocol::kOldestVersion) {
+    auto connected = std::make_shared<OpState>();
+    asio::async_connect(socket_, resolved->results, [connected](std::error_code ec, tcp::endpoint) {
+      connected->done = true;
+      connected->ec = ec;
+    });
+    await(connected, deadline, what, ms);
+    if (connected->ec) {
+      fail("ZinNet: cannot connect to " + endpoint_.text() + ": " + connected->ec.message() +
+           " (is `zinmox serve` running there?)");
+    }
+    std::error_code ec;
+    socket_.set_option(tcp::no_delay(true), ec);
+    if (greet(deadline, version)) break;
+    disconnect();
   }
-  std::error_code ec;
-  socket_.set_option(tcp::no_delay(true), ec);
-  greet(deadline);
   connected_ = true;
 }
 
-void ClientChannel::greet(Clock::time_point deadline) {
+bool ClientChannel::greet(Clock::time_point deadline, uint16_t version) {
   const uint32_t ms = options_.connectTimeoutMs;
   const std::string what = "greeting " + endpoint_.text();
   FrameWriter hello(MessageType::Hello);
-  hello.bytes(Protocol::kMagic, 4).u16(Protocol::kVersion);
+  hello.bytes(Protocol::kMagic, 4).u16(version);
   writeAll(hello.finish(), deadline, what, ms);
   const Frame reply = readFrame(deadline, what, ms);
   if (reply.type == MessageType::Closing) {
-    fail("ZinNet: the server at " + endpoint_.text() +
-         " refused the connection: " + std::string(reply.body.begin(), reply.body.end()));
+    const std::string text(reply.body.begin(), reply.body.end());
+    if (version != Protocol::kOldestVersion && text.rfind("protocol version ", 0) == 0) {
+      return false;
+    }
+    fail("ZinNet: the server at " + endpoint_.text() + " refused the connection: " + text);
   }
   try {
     FrameReader in(reply, "welcome");
     if (reply.type != MessageType::Welcome || std::memcmp(in.bytes(4), Protocol::kMagic, 4)) {
       throw FrameError("no welcome");
     }
-    const uint16_t version = in.u16();
-    if (version != Protocol::kVersion) {
+    const uint16_t answered = in.u16();
+    if (answered != version) {
       fail("ZinNet: the server at " + endpoint_.text() + " speaks protocol version " +
-           std::to_string(version) + "; this client speaks " + std::to_string(Protocol::kVersion));
+           std::to_string(answered) + "; this client speaks " +
+           std::to_string(Protocol::kOldestVersion) + " and " + std::to_string(Protocol::kVersion));
     }
     serverMaxFrame_ = in.u32();
     serverMaxRead_ = in.u32();
     serverName_ = in.rest();
+    version_ = version;
   } catch (const FrameError&) {
     fail("ZinNet: " + endpoint_.text() + " is not a ZinNet target server");
   }
+  return true;
 }
 
 void ClientChannel::writeAll(const std::vector<unsigned char>& bytes, Clock::time_point deadline,

@@ -37,13 +37,16 @@ class ClientChannel {
   uint32_t serverMaxFrame() const { return serverMaxFrame_; }
   uint32_t serverMaxRead() const { return serverMaxRead_; }
   std::string serverText() const { return endpoint_.text(); }
+  /// The protocol version agreed in the greeting.
+  uint16_t version() const { return version_; }
 
  private:
   using Clock = std::chrono::steady_clock;
   struct OpState;
 
   void connectNow();
-  void greet(Clock::time_point deadline);
+  /// False when the server refused `version` and an older one is left to try.
+  bool greet(Clock::time_point deadline, uint16_t version);
   bool closedByPeer();
   void await(const std::shared_ptr<OpState>& state, Clock::time_point deadline,
              const std::string& what, uint32_t timeoutMs);
@@ -61,6 +64,7 @@ class ClientChannel {
   std::string serverName_;
   uint32_t serverMaxFrame_ = 0;
   uint32_t serverMaxRead_ = 0;
+  uint16_t version_ = 0;
 };
 
 }  // namespace ZinNet

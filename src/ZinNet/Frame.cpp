@@ -114,6 +114,15 @@ std::string typeText(uint8_t type) {
     case MessageType::ListCores:
       name = "core list";
       break;
+    case MessageType::SequenceAndFlush:
+      name = "command sequence and flush";
+      break;
+    case MessageType::Ping:
+      name = "ping";
+      break;
+    case MessageType::Pong:
+      name = "pong";
+      break;
     case MessageType::Welcome:
       name = "welcome";
       break;

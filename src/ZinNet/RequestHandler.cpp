@@ -36,9 +36,10 @@ std::vector<unsigned char> readStatus(const Frame& request, ZinRT::Zin_Transport
   return out.bytes(status.data(), status.size()).finish();
 }
 
+// A command sequence, and with `thenFlush` the flush after it (which a failed sequence skips).
 std::vector<unsigned char> commandSequence(const Frame& request, ZinRT::Zin_Transport& transport,
-                                           uint32_t maxReadBytes) {
-  FrameReader in(request, "command sequence");
+                                           uint32_t maxReadBytes, bool thenFlush) {
+  FrameReader in(request, thenFlush ? "command sequence and flush" : "command sequence");
   const uint32_t readBits = in.u32();
   const std::string text = in.rest();
   const uint32_t readBytes = readBits / 8 + (readBits % 8 != 0 ? 1 : 0);
@@ -47,7 +48,12 @@ std::vector<unsigned char> commandSequence(const Frame& request, ZinRT::Zin_Tran
                      " bytes of read data (at most " + std::to_string(maxReadBytes) + ")");
   }
   std::vector<unsigned char> data(readBytes, 0);
-  transport.commandSequence(text, readBits != 0 ? data.data() : nullptr, readBits);
+  unsigned char* into = readBits != 0 ? data.data() : nullptr;
+  if (thenFlush) {
+    transport.commandSequenceThenFlush(text, into, readBits);
+  } else {
+    transport.commandSequence(text, into, readBits);
+  }
   return FrameWriter(MessageType::ReadData).bytes(data.data(), data.size()).finish();
 }
 
@@ -76,7 +82,9 @@ std::vector<unsigned char> dispatch(const Frame& request, ZinRT::Zin_Transport& 
     case MessageType::ReadStatus:
       return readStatus(request, transport);
     case MessageType::CommandSequence:
-      return commandSequence(request, transport, maxReadBytes);
+      return commandSequence(request, transport, maxReadBytes, false);
+    case MessageType::SequenceAndFlush:
+      return commandSequence(request, transport, maxReadBytes, true);
     case MessageType::Flush:
       return flush(request, transport);
     case MessageType::ListCores:
@@ -88,7 +96,8 @@ std::vector<unsigned char> dispatch(const Frame& request, ZinRT::Zin_Transport& 
 
 }  // namespace
 
-bool isRequest(MessageType type) {
+bool isRequest(MessageType type, uint16_t version) {
+  if (type == MessageType::SequenceAndFlush) return version >= 2;
   return type == MessageType::ReadStatus || type == MessageType::CommandSequence ||
          type == MessageType::Flush || type == MessageType::ListCores;
 }

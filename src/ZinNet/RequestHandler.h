@@ -17,13 +17,14 @@ struct Reply {
   bool refused = false;              // the request was malformed or beyond the limits
 };
 
-/// Checks the request (status read, command sequence, flush or core list) against the limits and
+/// Checks the request (status read, command sequence with or without its flush, flush or core
+/// list) against the limits and
 /// carries it out. A malformed request gets a refusal, an exception of the transport a target
 /// failure frame with its text; nothing throws.
 Reply carryOut(const Frame& request, ZinRT::Zin_Transport& transport, uint32_t maxReadBytes);
 
-/// Whether a type byte is one of the requests carryOut takes.
-bool isRequest(Protocol::MessageType type);
+/// Whether a type byte is one of the requests carryOut takes in protocol `version`.
+bool isRequest(Protocol::MessageType type, uint16_t version);
 
 /// A frame holding a text (refusal, closing, target failure).
 std::vector<unsigned char> textFrame(Protocol::MessageType type, std::string_view text);

@@ -4,8 +4,6 @@
 #include <cstring>
 #include <utility>
 
-#include "RequestHandler.h"
-
 namespace ZinNet {
 
 using Protocol::MessageType;
@@ -14,14 +12,16 @@ ServerConnection::ServerConnection(std::shared_ptr<ServerState> state, asio::ip:
                                    asio::any_io_executor requests, uint64_t id)
     : state_(std::move(state)),
       socket_(std::move(socket)),
-      timer_(socket_.get_executor()),
       requests_(std::move(requests)),
-      id_(id) {
+      id_(id),
+      timer_(socket_.get_executor()) {
   std::error_code ec;
   const auto remote = socket_.remote_endpoint(ec);
   peer_ = ec ? std::string("an unknown peer")
              : remote.address().to_string() + ":" + std::to_string(remote.port());
   socket_.set_option(asio::ip::tcp::no_delay(true), ec);
+  // Replies are first written directly; only what the socket does not take at once waits.
+  socket_.non_blocking(true, ec);
   ++state_->connectionsOpen;
 }
 
@@ -32,7 +32,7 @@ ServerConnection::~ServerConnection() {
 void ServerConnection::start() {
   state_->log("connection " + std::to_string(id_) + " from " + peer_ + " opened");
   armTimer(state_->options.greetingTimeoutMs, "the greeting");
-  readPrefix();
+  readNext();
 }
 
 bool ServerConnection::evictable(std::chrono::steady_clock::time_point& since) const {
@@ -65,20 +65,36 @@ void ServerConnection::refuse(const std::string& why, bool thenClose) {
 }
 
 void ServerConnection::armTimer(uint32_t ms, const char* what) {
+  deadlineSet_ = ms != 0;
+  if (!deadlineSet_) return;
+  deadline_ = Clock::now() + std::chrono::milliseconds(ms);
+  deadlineMs_ = ms;
+  deadlineWhat_ = what;
+  if (!timerPending_ || timerAt_ > deadline_) startTimer(deadline_);
+}
+
+void ServerConnection::startTimer(Clock::time_point at) {
   const uint64_t generation = ++timerGeneration_;
-  timer_.cancel();
-  if (ms == 0) return;
-  timer_.expires_after(std::chrono::milliseconds(ms));
-  timer_.async_wait([self = shared_from_this(), generation, ms, what](std::error_code ec) {
-    if (ec || generation != self->timerGeneration_ || self->closed_) return;
-    ++self->state_->framesRefused;
-    self->close(std::string(what) + " not done within " + std::to_string(ms) + " ms");
+  timerPending_ = true;
+  timerAt_ = at;
+  timer_.expires_at(at);
+  timer_.async_wait([self = shared_from_this(), generation](std::error_code ec) {
+    self->onTimer(ec, generation);
   });
 }
 
-void ServerConnection::disarmTimer() {
-  ++timerGeneration_;
-  timer_.cancel();
+void ServerConnection::onTimer(std::error_code ec, uint64_t generation) {
+  if (ec || generation != timerGeneration_ || closed_) return;
+  timerPending_ = false;
+  if (!deadlineSet_) return;
+  if (Clock::now() < deadline_) {
+    startTimer(deadline_);  // the deadline moved on since the timer was set
+  } else if (lingering_) {
+    close("closed by the server");
+  } else {
+    ++state_->framesRefused;
+    close(std::string(deadlineWhat_) + " not done within " + std::to_string(deadlineMs_) + " ms");
+  }
 }
 
 void ServerConnection::onReadError(std::error_code ec, const char* where) {
@@ -96,46 +112,79 @@ void ServerConnection::onReadError(std::error_code ec, const char* where) {
   }
 }
 
-void ServerConnection::readPrefix() {
+// Reads the next frame. Bytes a client sent ahead of its reply wait in head_ and are taken only
+// now, on a fresh handler (a client cannot make the server recurse).
+void ServerConnection::readNext() {
   if (closed_) return;
-  // Before the hello, the greeting timer armed at the start runs on.
-  if (prefixBytes_ == 0 && greeted_) {
-    armTimer(state_->options.idleTimeoutMs, "waiting for a frame");
+  if (greeted_) {
+    if (headBytes_ == 0) {
+      armTimer(state_->options.idleTimeoutMs, "waiting for a frame");
+    } else {
+      armTimer(state_->options.frameTimeoutMs, "a frame");
+      asio::post(socket_.get_executor(), [self = shared_from_this()] { self->takeFrame(); });
+      return;
+    }
   }
-  socket_.async_read_some(
-      asio::buffer(prefix_.data() + prefixBytes_, prefix_.size() - prefixBytes_),
-      [self = shared_from_this()](std::error_code ec, size_t n) { self->onPrefix(ec, n); });
+  readMore();
 }
 
-void ServerConnection::onPrefix(std::error_code ec, size_t n) {
+void ServerConnection::readMore() {
+  socket_.async_read_some(
+      asio::buffer(head_.data() + headBytes_, head_.size() - headBytes_),
+      [self = shared_from_this()](std::error_code ec, size_t n) { self->onRead(ec, n); });
+}
+
+void ServerConnection::onRead(std::error_code ec, size_t n) {
   if (ec) {
-    onReadError(ec, prefixBytes_ == 0 ? "between frames" : "inside a frame's length");
+    onReadError(ec, headBytes_ == 0                       ? "between frames"
+                    : headBytes_ < Protocol::kLengthBytes ? "inside a frame's length"
+                                                          : "inside a frame");
     return;
   }
-  if (prefixBytes_ == 0 && n != 0 && greeted_) {
+  if (headBytes_ == 0 && n != 0 && greeted_) {
     armTimer(state_->options.frameTimeoutMs, "a frame");
   }
-  prefixBytes_ += n;
-  if (prefixBytes_ < prefix_.size()) {
-    readPrefix();
+  headBytes_ += n;
+  takeFrame();
+}
+
+void ServerConnection::takeFrame() {
+  if (closed_) return;
+  if (headBytes_ < Protocol::kLengthBytes) {
+    readMore();
     return;
   }
-  prefixBytes_ = 0;
-  const uint32_t length = decodeLength(prefix_.data());
+  const uint32_t length = decodeLength(head_.data());
   if (length == 0) {
     refuse("frame of length 0", true);
-  } else if (length > state_->options.maxFrameBytes) {
+    return;
+  }
+  if (length > state_->options.maxFrameBytes) {
     refuse("frame of " + std::to_string(length) + " bytes exceeds the limit of " +
                std::to_string(state_->options.maxFrameBytes) + " bytes",
            true);
-  } else {
-    readBody(length);
+    return;
   }
+  const size_t end = Protocol::kLengthBytes + size_t{length};
+  if (end > headBytes_) {
+    readBody(length);
+    return;
+  }
+  Frame frame;
+  frame.type = static_cast<MessageType>(head_[Protocol::kLengthBytes]);
+  frame.body.assign(head_.begin() + Protocol::kLengthBytes + 1, head_.begin() + end);
+  std::memmove(head_.data(), head_.data() + end, headBytes_ - end);
+  headBytes_ -= end;
+  onFrame(std::move(frame));
 }
 
+// A frame larger than what has arrived: its start moves to body_, the rest is read into it.
 void ServerConnection::readBody(uint32_t length) {
+  const size_t have = headBytes_ - Protocol::kLengthBytes;
   body_.assign(length, 0);
-  asio::async_read(socket_, asio::buffer(body_),
+  std::memcpy(body_.data(), head_.data() + Protocol::kLengthBytes, have);
+  headBytes_ = 0;
+  asio::async_read(socket_, asio::buffer(body_.data() + have, length - have),
                    [self = shared_from_this()](std::error_code ec, size_t) {
                      if (ec) {
                        self->onReadError(ec, "inside a frame");
@@ -159,7 +208,9 @@ void ServerConnection::onFrame(Frame frame) {
     onHello(frame);
   } else if (frame.type == MessageType::Hello) {
     refuse("hello sent twice", false);
-  } else if (!isRequest(frame.type)) {
+  } else if (frame.type == MessageType::Ping && version_ >= 2) {
+    onPing(frame);
+  } else if (!isRequest(frame.type, version_)) {
     refuse("unknown request type " + typeText(static_cast<uint8_t>(frame.type)), false);
   } else {
     runRequest(std::move(frame));
@@ -177,42 +228,62 @@ void ServerConnection::onHello(const Frame& frame) {
     return;
   }
   const uint16_t version = in.u16();
-  if (version != Protocol::kVersion) {
+  if (version < Protocol::kOldestVersion || version > Protocol::kVersion) {
     refuse("protocol version " + std::to_string(version) +
-               " is not supported; this server speaks " + std::to_string(Protocol::kVersion),
+               " is not supported; this server speaks " + std::to_string(Protocol::kOldestVersion) +
+               " and " + std::to_string(Protocol::kVersion),
            true);
     return;
   }
   greeted_ = true;
+  version_ = version;
   FrameWriter out(MessageType::Welcome);
-  out.bytes(Protocol::kMagic, 4).u16(Protocol::kVersion);
+  out.bytes(Protocol::kMagic, 4).u16(version);
   out.u32(state_->options.maxFrameBytes).u32(state_->options.maxReadBytes);
   send(out.text(boundedText(state_->options.name)).finish(), false);
 }
 
+// Answered on the I/O thread: a ping measures the way to the server and back, not the target.
+void ServerConnection::onPing(const Frame& frame) {
+  try {
+    FrameReader(frame, "ping").end();
+  } catch (const FrameError& e) {
+    refuse(e.what(), false);
+    return;
+  }
+  send(FrameWriter(MessageType::Pong).finish(), false);
+}
+
 void ServerConnection::runRequest(Frame frame) {
-  // The request runs on the request executor; the reply comes back to the I/O thread.
-  // Each post takes one request from the queue, the small ones first.
   const MessageType type = frame.type;
   const size_t bodyBytes = frame.body.size();
+  // A small request with nothing ahead of it runs at once, here: no hand-off to another thread
+  // and back. The I/O thread never waits for the request mutex.
+  if (bodyBytes <= RequestQueue::kSmallRequestBytes && state_->handedOff == 0) {
+    std::unique_lock<std::mutex> lock(state_->requestMutex, std::try_to_lock);
+    if (lock.owns_lock()) {
+      Reply reply = carryOut(frame, *state_->transport, state_->options.maxReadBytes);
+      lock.unlock();
+      finishRequest(type, std::move(reply));
+      return;
+    }
+  }
+  // Otherwise it waits its turn for the request executor; the reply comes back to the I/O
+  // thread. Each post takes one request from the queue, the small ones first.
+  ++state_->handedOff;
   state_->waiting.push(bodyBytes, [self = shared_from_this(), type, frame = std::move(frame)]() {
-    if (self->state_->stopping) return;
+    if (self->state_->stopping) {
+      --self->state_->handedOff;
+      return;
+    }
     Reply reply;
     {
       std::lock_guard<std::mutex> lock(self->state_->requestMutex);
       reply = carryOut(frame, *self->state_->transport, self->state_->options.maxReadBytes);
     }
+    --self->state_->handedOff;
     asio::post(self->socket_.get_executor(), [self, type, reply = std::move(reply)]() mutable {
-      if (reply.carriedOut) {
-        ++self->state_->requestsServed;
-        ++self->requestCount_;
-      }
-      if (reply.refused) {
-        ++self->state_->framesRefused;
-        self->state_->log("connection " + std::to_string(self->id_) + ": refused a malformed " +
-                          typeText(static_cast<uint8_t>(type)) + " request");
-      }
-      self->send(std::move(reply.bytes), false);
+      self->finishRequest(type, std::move(reply));
     });
   });
   asio::post(requests_, [state = state_]() {
@@ -220,21 +291,31 @@ void ServerConnection::runRequest(Frame frame) {
   });
 }
 
+void ServerConnection::finishRequest(MessageType type, Reply reply) {
+  if (reply.carriedOut) {
+    ++state_->requestsServed;
+    ++requestCount_;
+  }
+  if (reply.refused) {
+    ++state_->framesRefused;
+    state_->log("connection " + std::to_string(id_) + ": refused a malformed " +
+                typeText(static_cast<uint8_t>(type)) + " request");
+  }
+  send(std::move(reply.bytes), false);
+}
+
 void ServerConnection::lingerAndClose() {
   // Stop sending, then drop what the client still sends until it closes too (bounded by a
   // timer), so that the closing frame is not lost to a reset caused by unread bytes.
   std::error_code ec;
   socket_.shutdown(asio::ip::tcp::socket::shutdown_send, ec);
-  const uint64_t generation = ++timerGeneration_;
-  timer_.expires_after(std::chrono::milliseconds(kLingerMs));
-  timer_.async_wait([self = shared_from_this(), generation](std::error_code e) {
-    if (!e && generation == self->timerGeneration_) self->close("closed by the server");
-  });
+  lingering_ = true;
+  armTimer(kLingerMs, "closing");
   drain();
 }
 
 void ServerConnection::drain() {
-  socket_.async_read_some(asio::buffer(scratch_),
+  socket_.async_read_some(asio::buffer(head_),
                           [self = shared_from_this()](std::error_code ec, size_t) {
                             if (self->closed_) return;
                             if (ec) {
@@ -247,23 +328,38 @@ void ServerConnection::drain() {
 
 void ServerConnection::send(std::vector<unsigned char> bytes, bool thenClose) {
   if (closed_) return;
+  // Most replies fit the socket's buffer and are written at once, without a timer.
+  std::error_code ec;
+  const size_t written = socket_.write_some(asio::buffer(bytes), ec);
+  if (!ec && written == bytes.size()) {
+    afterSend(ec, thenClose);
+    return;
+  }
+  if (ec && ec != asio::error::would_block && ec != asio::error::try_again) {
+    afterSend(ec, thenClose);
+    return;
+  }
   outgoing_ = std::move(bytes);
   armTimer(state_->options.writeTimeoutMs, "sending a reply");
-  asio::async_write(socket_, asio::buffer(outgoing_),
-                    [self = shared_from_this(), thenClose](std::error_code ec, size_t) {
+  asio::async_write(socket_, asio::buffer(outgoing_.data() + written, outgoing_.size() - written),
+                    [self = shared_from_this(), thenClose](std::error_code e, size_t) {
                       if (self->closed_) return;
-                      self->disarmTimer();
                       self->outgoing_ = {};  // no reply is kept between requests
-                      if (ec) {
-                        self->close("write failed: " + ec.message());
-                      } else if (thenClose) {
-                        self->lingerAndClose();
-                      } else {
-                        self->inExchange_ = false;
-                        self->lastExchange_ = std::chrono::steady_clock::now();
-                        self->readPrefix();
-                      }
+                      self->afterSend(e, thenClose);
                     });
+}
+
+void ServerConnection::afterSend(std::error_code ec, bool thenClose) {
+  disarmTimer();
+  if (ec) {
+    close("write failed: " + ec.message());
+  } else if (thenClose) {
+    lingerAndClose();
+  } else {
+    inExchange_ = false;
+    lastExchange_ = Clock::now();
+    readNext();
+  }
 }
 
 }  // namespace ZinNet

@@ -11,13 +11,15 @@
 
 #include "Asio.h"
 #include "Frame.h"
+#include "RequestHandler.h"
 #include "ServerState.h"
 
 namespace ZinNet {
 
-/// Lives on the server's I/O thread; the requests themselves run on the request executor, one at
-/// a time under the server's request mutex. A connection reads its next frame only after the reply
-/// to the previous one is written, so a client cannot queue up work on the server.
+/// Lives on the server's I/O thread. Requests run one at a time under the server's request mutex:
+/// a small one at once on the I/O thread when no other request waits or runs, any other on the
+/// request executor. A connection reads its next frame only after the reply to the previous one
+/// is written, so a client cannot queue up work on the server.
 class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
  public:
   ServerConnection(std::shared_ptr<ServerState> state, asio::ip::tcp::socket socket,
@@ -37,38 +39,59 @@ class ServerConnection : public std::enable_shared_from_this<ServerConnection> {
   bool evictable(std::chrono::steady_clock::time_point& since) const;
 
  private:
-  void readPrefix();
-  void onPrefix(std::error_code ec, size_t n);
+  using Clock = std::chrono::steady_clock;
+
+  void readNext();
+  void readMore();
+  void onRead(std::error_code ec, size_t n);
+  void takeFrame();
   void readBody(uint32_t length);
   void onFrame(Frame frame);
   void onHello(const Frame& frame);
+  void onPing(const Frame& frame);
   void runRequest(Frame frame);
+  void finishRequest(Protocol::MessageType type, Reply reply);
   void send(std::vector<unsigned char> bytes, bool thenClose);
+  void afterSend(std::error_code ec, bool thenClose);
   void lingerAndClose();
   void drain();
   void refuse(const std::string& why, bool thenClose);
   void armTimer(uint32_t ms, const char* what);
-  void disarmTimer();
+  void disarmTimer() { deadlineSet_ = false; }
+  void startTimer(Clock::time_point at);
+  void onTimer(std::error_code ec, uint64_t generation);
   void onReadError(std::error_code ec, const char* where);
 
   std::shared_ptr<ServerState> state_;
   asio::ip::tcp::socket socket_;
-  asio::steady_timer timer_;
   asio::any_io_executor requests_;
   uint64_t id_;
   std::string peer_;
+  uint16_t version_ = 0;  // agreed in the greeting
+  // One timer per connection guards the current deadline. Moving the deadline later only
+  // updates these fields; the timer, when it fires early, waits again for the rest. So the usual
+  // exchange (the whole frame in one read, the reply in one write) sets no timer at all.
+  asio::steady_timer timer_;
   uint64_t timerGeneration_ = 0;
-  std::array<unsigned char, Protocol::kLengthBytes> prefix_{};
-  size_t prefixBytes_ = 0;
+  bool timerPending_ = false;
+  Clock::time_point timerAt_{};
+  bool deadlineSet_ = false;
+  Clock::time_point deadline_{};
+  uint32_t deadlineMs_ = 0;
+  const char* deadlineWhat_ = "";
+  // Bytes received and not yet taken: usually one whole small frame. A frame that does not fit
+  // is completed in body_.
+  std::array<unsigned char, 4096> head_{};
+  size_t headBytes_ = 0;
   std::vector<unsigned char> body_;
   std::vector<unsigned char> outgoing_;
-  std::array<unsigned char, 4096> scratch_{};
   static constexpr uint32_t kLingerMs = 1000;
   bool greeted_ = false;
   bool closed_ = false;
   bool leaving_ = false;     // a closing frame is being sent
+  bool lingering_ = false;   // the closing frame is sent; waiting for the client to close
   bool inExchange_ = false;  // a request is queued, carried out or answered
-  std::chrono::steady_clock::time_point lastExchange_ = std::chrono::steady_clock::now();
+  Clock::time_point lastExchange_ = Clock::now();
   uint64_t requestCount_ = 0;
 };
 

@@ -25,6 +25,9 @@ struct ServerState {
   const ServerOptions options;
   std::mutex requestMutex;  // held for each request carried out on the transport
   RequestQueue waiting;     // requests handed to the request thread, not yet begun
+  // Requests handed to the request thread and not finished: while there are any, new requests
+  // queue behind them instead of running on the I/O thread.
+  std::atomic<uint32_t> handedOff{0};
   std::mutex logMutex;
   std::atomic<bool> stopping{false};
   std::atomic<uint64_t> connectionsAccepted{0};

@@ -89,8 +89,25 @@ void TcpTransport::readStatus(const ZIN_CORE_REF& ref, ZIN_CORE_INFO& info, unsi
 
 void TcpTransport::commandSequence(const std::string& text, unsigned char* readData,
                                    uint32_t readBitCount) {
-  const uint32_t readBytes = readBitCount / 8 + (readBitCount % 8 != 0 ? 1 : 0);
   std::lock_guard<std::mutex> lock(mutex_);
+  sendSequence(static_cast<uint8_t>(MessageType::CommandSequence), text, readData, readBitCount);
+}
+
+void TcpTransport::commandSequenceThenFlush(const std::string& text, unsigned char* readData,
+                                            uint32_t readBitCount) {
+  std::lock_guard<std::mutex> lock(mutex_);
+  impl_->channel.ensureConnected();
+  if (impl_->channel.version() >= 2) {
+    sendSequence(static_cast<uint8_t>(MessageType::SequenceAndFlush), text, readData, readBitCount);
+    return;
+  }
+  sendSequence(static_cast<uint8_t>(MessageType::CommandSequence), text, readData, readBitCount);
+  flushLocked();
+}
+
+void TcpTransport::sendSequence(uint8_t type, const std::string& text, unsigned char* readData,
+                                uint32_t readBitCount) {
+  const uint32_t readBytes = readBitCount / 8 + (readBitCount % 8 != 0 ? 1 : 0);
   ClientChannel& channel = impl_->channel;
   channel.ensureConnected();
   if (text.size() + 5 > channel.serverMaxFrame()) {
@@ -103,7 +120,7 @@ void TcpTransport::commandSequence(const std::string& text, unsigned char* readD
                    " bytes is more than the server at " + channel.serverText() + " takes (" +
                    std::to_string(channel.serverMaxRead()) + " bytes)");
   }
-  FrameWriter request(MessageType::CommandSequence);
+  FrameWriter request(static_cast<MessageType>(type));
   request.u32(readBitCount).text(text);
   const Frame reply =
       channel.exchange(request.finish(), MessageType::ReadData, "a command sequence");
@@ -116,8 +133,33 @@ void TcpTransport::commandSequence(const std::string& text, unsigned char* readD
   if (readBytes != 0) std::memcpy(readData, reply.body.data(), readBytes);
 }
 
+void TcpTransport::ping() {
+  std::lock_guard<std::mutex> lock(mutex_);
+  ClientChannel& channel = impl_->channel;
+  channel.ensureConnected();
+  if (channel.version() < 2) {
+    throw NetError("ZinNet: the server at " + channel.serverText() +
+                   " speaks protocol version 1, which has no ping");
+  }
+  const Frame reply =
+      channel.exchange(FrameWriter(MessageType::Ping).finish(), MessageType::Pong, "a ping");
+  if (!reply.body.empty()) {
+    channel.disconnect();
+    throw NetError("ZinNet: " + channel.serverText() + " answered a ping with a non-empty body");
+  }
+}
+
+uint16_t TcpTransport::protocolVersion() const {
+  std::lock_guard<std::mutex> lock(mutex_);
+  return impl_->channel.version();
+}
+
 void TcpTransport::flush() {
   std::lock_guard<std::mutex> lock(mutex_);
+  flushLocked();
+}
+
+void TcpTransport::flushLocked() {
   ClientChannel& channel = impl_->channel;
   const Frame reply =
       channel.exchange(FrameWriter(MessageType::Flush).finish(), MessageType::Flushed, "a flush");

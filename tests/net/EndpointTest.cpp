@@ -8,7 +8,7 @@ namespace {
 using ZinNet::parseEndpoint;
 using ZinNet::parseTcpTarget;
 
-TEST(Endpoint, HostPortFormsAndTheirFaults) {
+TEST(Endpoint, HostPortFormsTcpTargetsAndTheirFaults) {
   EXPECT_EQ(parseEndpoint("127.0.0.1:7700").text(), "127.0.0.1:7700");
   EXPECT_EQ(parseEndpoint("localhost:1").port, 1);
   EXPECT_EQ(parseEndpoint("[::1]:65535").host, "::1");
@@ -23,9 +23,7 @@ TEST(Endpoint, HostPortFormsAndTheirFaults) {
   } catch (const std::invalid_argument& e) {
     EXPECT_STREQ(e.what(), "ZinNet: \"127.0.0.1\" is not HOST:PORT: missing ':PORT'");
   }
-}
-
-TEST(Endpoint, TcpTargets) {
+  // tcp:// targets
   EXPECT_FALSE(parseTcpTarget("board.json").has_value());
   EXPECT_FALSE(parseTcpTarget("").has_value());
   EXPECT_EQ(parseTcpTarget("tcp://127.0.0.1:7700")->port, 7700);

@@ -1,6 +1,9 @@
 // Raw frames, the test server and the raw client.
 #include "NetTestUtil.h"
 
+#include <poll.h>
+#include <sys/socket.h>
+
 #include <thread>
 
 namespace ZinNetTest {
@@ -80,23 +83,18 @@ void RawClient::close() {
 
 bool RawClient::readExactly(unsigned char* data, size_t size,
                             std::chrono::steady_clock::time_point end) {
-  if (ended_) return false;
-  bool done = false;
-  std::error_code result;
-  asio::async_read(socket_, asio::buffer(data, size), [&](std::error_code ec, size_t) {
-    done = true;
-    result = ec;
-  });
-  io_.restart();
-  io_.run_until(end);
-  if (!done) {
-    socket_.cancel();
-    io_.restart();
-    io_.run();
-    return false;
+  while (size > 0 && !ended_) {
+    const auto left =
+        std::chrono::ceil<std::chrono::milliseconds>(end - std::chrono::steady_clock::now());
+    pollfd ready{socket_.native_handle(), POLLIN, 0};
+    if (left.count() <= 0 || ::poll(&ready, 1, static_cast<int>(left.count())) <= 0) return false;
+    const ssize_t n = ::recv(ready.fd, data, size, 0);
+    if (n <= 0) ended_ = true;
+    if (n <= 0) return false;
+    data += n;
+    size -= static_cast<size_t>(n);
   }
-  if (result) ended_ = true;
-  return !result;
+  return size == 0;
 }
 
 std::optional<RawFrame> RawClient::readFrame(std::chrono::milliseconds limit) {
@@ -126,11 +124,13 @@ bool RawClient::closedWithin(std::chrono::milliseconds limit) {
   return ended_;
 }
 
-void RawClient::greet() {
-  send(hello());
+void RawClient::greet(uint16_t version) {
+  send(hello(version));
   const std::optional<RawFrame> welcome = readFrame();
   ASSERT_TRUE(welcome.has_value());
   ASSERT_EQ(welcome->type, 0x81);
+  ASSERT_GE(welcome->body.size(), 6u);
+  EXPECT_EQ((welcome->body[4] << 8) | welcome->body[5], version);
 }
 
 }  // namespace ZinNetTest

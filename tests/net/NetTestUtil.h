@@ -21,13 +21,23 @@ namespace ZinNetTest {
 
 using Bytes = std::vector<unsigned char>;
 
+// Message types (docs/protocol.md).
+constexpr uint8_t kReadStatus = 0x02;
+constexpr uint8_t kSequence = 0x03;
+constexpr uint8_t kSequenceAndFlush = 0x06;
+constexpr uint8_t kPing = 0x07;
+constexpr uint8_t kReadData = 0x83;
+constexpr uint8_t kPong = 0x87;
+constexpr uint8_t kRefused = 0xE1;
+constexpr uint8_t kClosing = 0xE2;
+
 /// Frame bytes built by hand: big-endian length of (type + body), type, body.
 Bytes frame(uint8_t type, const Bytes& body = {});
 Bytes u32(uint32_t value);
 Bytes concat(std::initializer_list<Bytes> parts);
 Bytes text(const std::string& s);
-/// A hello of the given version (1 is the current one).
-Bytes hello(uint16_t version = 1);
+/// A hello of the given version.
+Bytes hello(uint16_t version = 2);
 
 /// A server test mode: serves `transport` on 127.0.0.1 and a free port; the log is kept.
 class TestServer {
@@ -70,8 +80,8 @@ class RawClient {
   /// Whether the server closed the connection within `limit` (frames before the end are
   /// dropped); false when it is still open at the limit.
   bool closedWithin(std::chrono::milliseconds limit);
-  /// Sends a hello and checks the welcome.
-  void greet();
+  /// Sends a hello and checks that the welcome has the same version.
+  void greet(uint16_t version = 2);
 
  private:
   bool readExactly(unsigned char* data, size_t size, std::chrono::steady_clock::time_point end);

@@ -7,6 +7,8 @@
 #include <memory>
 #include <stdexcept>
 
+#include "ZinRT/ZinJtag.h"
+#include "ZinRT/Zin_Transport.h"
 #include "format/ZinMOX_BitFormat.h"
 #include "framework/ZinMOX_Framework.h"
 
@@ -181,8 +183,11 @@ void ZinMOX_Command::writeOutputs(uint32_t handle, const ZIN_CORE_REF& coreRef) 
   buildCommandText(coreRef, 1, text, nullptr);
   text += '\n';
   text += commitLine_.text;
-  Zin_CoreComm::commandSequence(handle, text, nullptr, 0, nullptr);
-  ZinJtag_target_flush(handle);
+  // The sequence and its flush go to the transport together: a remote target carries both in
+  // one round trip.
+  ZinJtag_session_withTransport(handle, [t = &text](ZinRT::Zin_Transport& transport) {
+    transport.commandSequenceThenFlush(*t, nullptr, 0);
+  });
 }
 
 void ZinMOX_Command::readInputs(uint32_t handle, const ZIN_CORE_REF& coreRef) {
