@@ -3,7 +3,12 @@
 import pytest
 
 CORE = "/api/cores/0:1:0"
-JSON = {"Content-Type": "application/json"}
+
+
+def named(**fields):
+    """A define or undefine body: x on async_out bit 0 unless `fields` say otherwise."""
+    return {"name": "x", "port": "async_out", "bits": "0", **fields}
+
 
 # (method, path, JSON body or raw bytes, extra headers, status, words of the message)
 CASES = [
@@ -14,18 +19,12 @@ CASES = [
     ("POST", CORE + "/write", {"values": {}}, None, 400, "nothing to write"),
     ("POST", CORE + "/write", {"value": {}}, None, 400, "unknown key 'value'"),
     ("POST", CORE + "/undefine", {"name": "ghost", "port": "async_out"}, None, 404, "no name"),
-    ("POST", CORE + "/define", {"name": "x", "port": "async_outs", "bits": "0"}, None, 400,
-     "unknown port"),
-    ("POST", CORE + "/define", {"name": "x", "port": "async_out", "bits": "0-99"}, None, 422,
-     "could not define"),
-    ("POST", CORE + "/define", {"name": "1x", "port": "async_out", "bits": "0"}, None, 400,
-     "bad name"),
-    ("POST", CORE + "/define", {"name": "x" * 65, "port": "async_out", "bits": "0"}, None, 400,
-     "1 to 64 characters"),
-    ("POST", CORE + "/define", {"name": "x", "port": "async_out", "bits": [-1]}, None, 400,
-     "bits"),
-    ("POST", "/api/cores/0:1:3/define", {"name": "x", "port": "async_out", "bits": "0"}, None,
-     404, "no MOX core at 0:1:3"),
+    ("POST", CORE + "/define", named(port="async_outs"), None, 400, "unknown port"),
+    ("POST", CORE + "/define", named(bits="0-99"), None, 422, "could not define"),
+    ("POST", CORE + "/define", named(name="1x"), None, 400, "bad name"),
+    ("POST", CORE + "/define", named(name="x" * 65), None, 400, "1 to 64 characters"),
+    ("POST", CORE + "/define", named(bits=[-1]), None, 400, "bits"),
+    ("POST", "/api/cores/0:1:3/define", named(), None, 404, "no MOX core at 0:1:3"),
     ("POST", "/api/cores/zz/write", {"values": {"a": "1"}}, None, 400, "malformed core"),
     ("POST", "/api/live", b"{bad", None, 400, "not valid JSON"),
     ("POST", "/api/live", b"[1]", None, 400, "must be a JSON object"),
@@ -46,9 +45,7 @@ CASES = [
 
 @pytest.fixture
 def defined(dashboard):
-    status, _ = dashboard.request("POST", CORE + "/define",
-                                  {"name": "leds", "port": "async_out", "bits": "0-7"})
-    assert status == 200
+    assert dashboard.request("POST", CORE + "/define", named(name="leds", bits="0-7"))[0] == 200
     return dashboard
 
 

@@ -8,12 +8,10 @@ from conftest import FULL
 
 
 def test_ints_texts_and_readings(session, core):
-    core.define("ctl", "async_out", [0, 1, 2, 3, 4, 5])
-    core.define("wide", "async_out", list(range(6, 16)))
-    core.define("status", "async_in", [0, 1, 2, 3, 4, 5])
-    core.define("upper", "async_in", list(range(6, 16)))
-    core.define("swapped", "async_in", [1, 0])  # value bit 0 is port bit 1
-    core.define("bus.low", "async_in", [0, 1])
+    for name, port, bits in [("ctl", "async_out", range(6)), ("wide", "async_out", range(6, 16)),
+                             ("status", "async_in", range(6)), ("upper", "async_in", range(6, 16)),
+                             ("swapped", "async_in", [1, 0]), ("bus.low", "async_in", [0, 1])]:
+        core.define(name, port, list(bits))  # swapped: value bit 0 is port bit 1
     core.read()  # clears what starting up left
     core.write(ctl=0x21, wide=0x2A5)
     readings = core.read()

@@ -29,9 +29,7 @@ std::optional<DescriptionError> errorOf(Call&& call) {
 
 TEST(Description, EveryProblemIsNamedByItsPointer) {
   struct Case {
-    std::string json;
-    std::string pointer;
-    std::string problem;
+    std::string json, pointer, problem;
   };
   const std::string core = "/devices/0/chains/0/cores/0";
   const std::vector<Case> cases = {
@@ -182,17 +180,13 @@ TEST(Description, ReadsEveryFieldAndWritesWhatItReads) {
   ASSERT_EQ(again.cores.size(), 5u);
   EXPECT_EQ(again.cores[3].status, (std::vector<unsigned char>{0xEE, 0xFF, 0xC0, 0x00}));
   const ZinSim::CoreDescription& c = again.cores[4];  // read, written and read again
-  EXPECT_EQ(c.ref.deviceIndex, 1u);
-  EXPECT_EQ(c.ref.userChainNumber, 2u);
-  EXPECT_EQ(c.ref.coreIndex, 7u);
-  EXPECT_EQ(c.manufacturerId, 0x1A5u);
-  EXPECT_EQ(c.qxMinorVersion, 17u);
-  EXPECT_EQ(c.syncInputs, 6u);
-  EXPECT_EQ(c.cyclesPerSequence, 0u);
+  EXPECT_EQ(std::tuple(c.ref.deviceIndex, c.ref.userChainNumber, c.ref.coreIndex),
+            std::tuple(1u, 2u, 7u));
+  EXPECT_EQ(std::tuple(c.manufacturerId, c.qxMinorVersion, c.syncInputs, c.cyclesPerSequence),
+            std::tuple(0x1A5u, 17u, 6u, 0u));
   ASSERT_EQ(c.wiring.size(), 2u);
   EXPECT_EQ(c.wiring[0].source.kind, ZinSim::InputSource::Kind::Square);
-  EXPECT_EQ(c.wiring[0].source.phase, 3u);
-  EXPECT_EQ(c.wiring[1].count, 3u);
+  EXPECT_EQ(std::tuple(c.wiring[0].source.phase, c.wiring[1].count), std::tuple(3u, 3u));
 }
 
 }  // namespace

@@ -13,14 +13,14 @@ struct ErrorCase {
 };
 
 void expectError(const ErrorCase& c) {
-  std::string line;
+  std::string line = "zinmox";
   for (const auto& arg : c.args) line += " " + arg;
   const auto result = runTool(c.args);
-  EXPECT_EQ(result.signal, 0) << "zinmox" << line << " crashed";
-  EXPECT_EQ(result.err.find("Sanitizer"), std::string::npos) << "zinmox" << line << result.err;
-  EXPECT_EQ(result.status, c.status) << "zinmox" << line << "\n" << result.err;
-  EXPECT_NE(result.err.find(c.message), std::string::npos)
-      << "zinmox" << line << "\nstderr: " << result.err;
+  SCOPED_TRACE(line + "\nstderr: " + result.err);
+  EXPECT_EQ(result.signal, 0) << "crashed";
+  EXPECT_EQ(result.err.find("Sanitizer"), std::string::npos);
+  EXPECT_EQ(result.status, c.status);
+  EXPECT_NE(result.err.find(c.message), std::string::npos);
 }
 
 TEST(ErrorPaths, UsageErrorsExitWithTwoAndAHint) {
