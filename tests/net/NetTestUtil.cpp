@@ -1,4 +1,4 @@
-// Raw frames, the test server and the raw client.
+// The test server and the raw client.
 #include "NetTestUtil.h"
 
 #include <poll.h>
@@ -7,30 +7,6 @@
 #include <thread>
 
 namespace ZinNetTest {
-
-Bytes u32(uint32_t value) {
-  return {static_cast<unsigned char>(value >> 24), static_cast<unsigned char>(value >> 16),
-          static_cast<unsigned char>(value >> 8), static_cast<unsigned char>(value)};
-}
-
-Bytes concat(std::initializer_list<Bytes> parts) {
-  Bytes out;
-  for (const Bytes& part : parts) out.insert(out.end(), part.begin(), part.end());
-  return out;
-}
-
-Bytes text(const std::string& s) {
-  return Bytes(s.begin(), s.end());
-}
-
-Bytes frame(uint8_t type, const Bytes& body) {
-  return concat({u32(static_cast<uint32_t>(body.size() + 1)), Bytes{type}, body});
-}
-
-Bytes hello(uint16_t version) {
-  return frame(0x01, concat({text("ZNET"), Bytes{static_cast<unsigned char>(version >> 8),
-                                                 static_cast<unsigned char>(version)}}));
-}
 
 TestServer::TestServer(std::shared_ptr<ZinRT::Zin_Transport> transport,
                        ZinNet::ServerOptions options) {
@@ -42,15 +18,6 @@ TestServer::TestServer(std::shared_ptr<ZinRT::Zin_Transport> transport,
   };
   server_ = std::make_unique<ZinNet::Server>(std::move(transport), std::move(options));
   server_->start();
-}
-
-TestServer::~TestServer() {
-  server_->stop();
-}
-
-std::vector<std::string> TestServer::log() const {
-  std::lock_guard<std::mutex> lock(log_->mutex);
-  return log_->lines;
 }
 
 bool TestServer::waitUntilNoConnections(std::chrono::milliseconds limit) {
@@ -66,19 +33,8 @@ RawClient::RawClient(uint16_t port) {
   socket_.connect({asio::ip::make_address("127.0.0.1"), port});
 }
 
-void RawClient::send(const Bytes& bytes) {
-  std::error_code ec;  // the server may already have closed: that is for the reads to show
-  asio::write(socket_, asio::buffer(bytes), ec);
-}
-
-void RawClient::shutdownSend() {
-  std::error_code ec;
-  socket_.shutdown(asio::ip::tcp::socket::shutdown_send, ec);
-}
-
-void RawClient::close() {
-  std::error_code ec;
-  socket_.close(ec);
+RawClient::RawClient(asio::ip::tcp::acceptor& acceptor) {
+  acceptor.accept(socket_);
 }
 
 bool RawClient::readExactly(unsigned char* data, size_t size,
@@ -89,8 +45,7 @@ bool RawClient::readExactly(unsigned char* data, size_t size,
     pollfd ready{socket_.native_handle(), POLLIN, 0};
     if (left.count() <= 0 || ::poll(&ready, 1, static_cast<int>(left.count())) <= 0) return false;
     const ssize_t n = ::recv(ready.fd, data, size, 0);
-    if (n <= 0) ended_ = true;
-    if (n <= 0) return false;
+    if ((ended_ = n <= 0)) return false;
     data += n;
     size -= static_cast<size_t>(n);
   }
@@ -115,6 +70,13 @@ std::optional<RawFrame> RawClient::readFrame(std::chrono::milliseconds limit) {
   return got;
 }
 
+RawFrame RawClient::exchange(const Bytes& request, std::chrono::milliseconds limit) {
+  send(request);
+  std::optional<RawFrame> reply = readFrame(limit);
+  if (!reply) ADD_FAILURE() << "no reply";
+  return reply.value_or(RawFrame{});
+}
+
 bool RawClient::closedWithin(std::chrono::milliseconds limit) {
   const auto end = std::chrono::steady_clock::now() + limit;
   while (!ended_ && std::chrono::steady_clock::now() < end) {
@@ -125,12 +87,10 @@ bool RawClient::closedWithin(std::chrono::milliseconds limit) {
 }
 
 void RawClient::greet(uint16_t version) {
-  send(hello(version));
-  const std::optional<RawFrame> welcome = readFrame();
-  ASSERT_TRUE(welcome.has_value());
-  ASSERT_EQ(welcome->type, 0x81);
-  ASSERT_GE(welcome->body.size(), 6u);
-  EXPECT_EQ((welcome->body[4] << 8) | welcome->body[5], version);
+  const RawFrame welcome = exchange(hello(version));
+  ASSERT_EQ(welcome.type, kWelcome);
+  ASSERT_GE(welcome.body.size(), 6u);
+  EXPECT_EQ((welcome.body[4] << 8) | welcome.body[5], version);
 }
 
 }  // namespace ZinNetTest

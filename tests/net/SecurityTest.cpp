@@ -15,16 +15,8 @@ namespace {
 
 using namespace ZinNetTest;
 
-constexpr uint8_t kFlush = 0x04, kTokenRequest = 0x10, kTokenProof = 0x11;
-constexpr uint8_t kChallenge = 0x90, kAccepted = 0x91, kClosing = 0xE2;
+constexpr uint8_t kTokenRequest = 0x10, kTokenProof = 0x11, kChallenge = 0x90, kAccepted = 0x91;
 const std::string kToken = "0123456789abcdef-test-token";
-const std::string kReadText = "00 1 0 04 1 00000004 0";  // the demo core's last input bits
-
-ZinNet::ServerOptions tokenOptions() {
-  ZinNet::ServerOptions options;
-  options.token = kToken;
-  return options;
-}
 
 // The proof a client that knows the token sends, computed here independently of the library.
 Bytes clientProof(const Bytes& serverNonce, const Bytes& clientNonce) {
@@ -48,30 +40,24 @@ Bytes challenge(RawClient& client, const Bytes& clientNonce) {
   return Bytes(challenge->body.begin(), challenge->body.begin() + 32);
 }
 
-void readOnce(ZinNet::TcpTransport& transport) {
-  unsigned char data[1] = {};
-  transport.commandSequence(kReadText, data, 4);
-}
-
-std::string failureOf(ZinNet::ClientOptions options, uint16_t port) {
-  try {
+// Opens a transport, reads the demo core's last input bits `times` times and disconnects.
+std::string readFailure(ZinNet::ClientOptions options, uint16_t port, int times = 1) {
+  return errorOf([&] {
     ZinNet::TcpTransport transport("127.0.0.1", port, options);
-    readOnce(transport);
-  } catch (const ZinNet::NetError& error) {
-    return error.what();
-  }
-  return "no failure";
+    unsigned char data[1] = {};
+    for (int i = 0; i < times; ++i) transport.commandSequence("00 1 0 04 1 00000004 0", data, 4);
+    transport.disconnect();  // an ordinary end, not a refused frame
+  });
 }
 
 TEST(Security, NoRequestIsServedBeforeTheTokenIsProven) {
-  TestServer server(std::make_shared<ZinSim::Target>(), tokenOptions());
+  TestServer server(std::make_shared<ZinSim::Target>(), {.token = kToken});
   const Bytes clientNonce(32, 0x5A);
   Bytes recorded;
   {
     RawClient client(server.port());
     recorded = clientProof(challenge(client, clientNonce), clientNonce);
-    client.send(frame(kTokenProof, recorded));
-    EXPECT_EQ(client.readFrame()->type, kAccepted);
+    EXPECT_EQ(client.exchange(frame(kTokenProof, recorded)).type, kAccepted);
   }
   // The recorded proof replayed on a new connection, a wrong proof, a request without a proof,
   // a frame beyond what a token frame needs.
@@ -79,14 +65,12 @@ TEST(Security, NoRequestIsServedBeforeTheTokenIsProven) {
     RawClient client(server.port());
     if (proof.size() != 32) {
       client.greet();
-      client.send(proof.empty() ? frame(kFlush) : frame(kTokenProof, proof));
     } else {
       challenge(client, clientNonce);
-      client.send(frame(kTokenProof, proof));
     }
-    const auto reply = client.readFrame();
-    ASSERT_TRUE(reply);
-    EXPECT_EQ(reply->type, kClosing) << reply->text();
+    const RawFrame reply =
+        client.exchange(proof.empty() ? frame(kFlush) : frame(kTokenProof, proof));
+    EXPECT_EQ(reply.type, kClosing) << reply.text();
   }
   EXPECT_EQ(server.server().stats().tokensRefused, 3u);
   EXPECT_EQ(server.server().stats().requestsServed, 0u);
@@ -94,16 +78,14 @@ TEST(Security, NoRequestIsServedBeforeTheTokenIsProven) {
   EXPECT_EQ(std::count_if(log.begin(), log.end(),
                           [](auto& l) { return l.find("refused: wrong token") != l.npos; }),
             2);
-  for (const auto& line : log) EXPECT_EQ(line.find(kToken), std::string::npos) << line;
+  for (const auto& line : log) EXPECT_THAT(line, testing::Not(HasSubstr(kToken)));
 
   ZinNet::ClientOptions options{2000, 2000};
-  EXPECT_NE(failureOf(options, server.port()).find("requires a token"), std::string::npos);
+  EXPECT_THAT(readFailure(options, server.port()), HasSubstr("requires a token"));
   options.token = "another-token-of-some-length";
-  EXPECT_NE(failureOf(options, server.port()).find("does not know the token"), std::string::npos);
+  EXPECT_THAT(readFailure(options, server.port()), HasSubstr("does not know the token"));
   options.token = kToken;
-  ZinNet::TcpTransport transport("127.0.0.1", server.port(), options);
-  readOnce(transport);
-  readOnce(transport);
+  EXPECT_EQ(readFailure(options, server.port(), 2), "no failure");
   EXPECT_EQ(server.server().stats().requestsServed, 2u);
 }
 
@@ -112,32 +94,24 @@ TEST(Security, OnlyLoopbackGoesWithoutATokenUnlessInsecure) {
   options.host = "0.0.0.0";
   std::vector<std::string> log;
   options.log = [&log](const std::string& line) { log.push_back(line); };
-  try {
-    ZinNet::Server(std::make_shared<ZinSim::Target>(), options).start();
-    ADD_FAILURE() << "an open address without a token was served";
-  } catch (const std::runtime_error& error) {
-    EXPECT_NE(std::string(error.what()).find("without a token"), std::string::npos);
-  }
+  EXPECT_THAT(errorOf<std::runtime_error>(
+                  [&] { ZinNet::Server(std::make_shared<ZinSim::Target>(), options).start(); }),
+              HasSubstr("without a token"));
   options.insecure = true;
-  ZinNet::Server open(std::make_shared<ZinSim::Target>(), options);
-  open.start();
-  open.stop();
-  EXPECT_NE(log.front().find("WARNING: open to other machines without a token"), std::string::npos);
+  ZinNet::Server(std::make_shared<ZinSim::Target>(), options).start();  // stops when destroyed
+  EXPECT_THAT(log.front(), HasSubstr("WARNING: open to other machines without a token"));
   // A client with a token insists that the server proves it too.
   TestServer plain(std::make_shared<ZinSim::Target>());
-  ZinNet::ClientOptions client{2000, 2000, kToken};
-  EXPECT_NE(failureOf(client, plain.port()).find("asks for no token"), std::string::npos);
+  EXPECT_THAT(readFailure({2000, 2000, kToken}, plain.port()), HasSubstr("asks for no token"));
 }
 
 TEST(Security, TlsCarriesTheTokenAndChecksTheCertificate) {
-  ZinNet::ServerOptions options = tokenOptions();
-  options.tlsCertFile = ZIN_NET_TLS_DIR "/cert.pem";
-  options.tlsKeyFile = ZIN_NET_TLS_DIR "/key.pem";
+  const ZinNet::ServerOptions options{.token = kToken,
+                                      .tlsCertFile = ZIN_NET_TLS_DIR "/cert.pem",
+                                      .tlsKeyFile = ZIN_NET_TLS_DIR "/key.pem"};
   TestServer server(std::make_shared<ZinSim::Target>(), options);
   ZinNet::ClientOptions client{2000, 2000, kToken, true, options.tlsCertFile};
-  ZinNet::TcpTransport transport("127.0.0.1", server.port(), client);
-  readOnce(transport);
-  readOnce(transport);
+  EXPECT_EQ(readFailure(client, server.port(), 2), "no failure");
   EXPECT_EQ(server.server().stats().requestsServed, 2u);
   // C hosts reach the same server through the options of ZinNet_openSessionWith.
   const ZinNet_SessionOptions c{
@@ -145,14 +119,13 @@ TEST(Security, TlsCarriesTheTokenAndChecksTheCertificate) {
   const uint32_t handle = ZinNet_openSessionWith(&c);
   EXPECT_NE(handle, 0u) << ZinNet_lastError();
   ZinJtag_closeSession(handle);
-  transport.disconnect();  // an ordinary end, not a refused frame
   EXPECT_TRUE(server.waitUntilNoConnections(std::chrono::seconds(3)));
   EXPECT_EQ(server.server().stats().framesRefused, 0u);
 
   client.tlsCaFile = "";  // the system's authorities do not know the test certificate
-  EXPECT_NE(failureOf(client, server.port()).find("certificate verify failed"), std::string::npos);
+  EXPECT_THAT(readFailure(client, server.port()), HasSubstr("certificate verify failed"));
   client.tls = false;
-  EXPECT_NE(failureOf(client, server.port()).find("127.0.0.1"), std::string::npos);
+  EXPECT_THAT(readFailure(client, server.port()), HasSubstr("127.0.0.1"));
   EXPECT_EQ(server.server().stats().requestsServed, 2u);
 }
 
