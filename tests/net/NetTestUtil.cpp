@@ -29,8 +29,9 @@ bool TestServer::waitUntilNoConnections(std::chrono::milliseconds limit) {
   return true;
 }
 
-RawClient::RawClient(uint16_t port) {
+RawClient::RawClient(uint16_t port, uint16_t version) {
   socket_.connect({asio::ip::make_address("127.0.0.1"), port});
+  if (version != 0) greet(version);
 }
 
 RawClient::RawClient(asio::ip::tcp::acceptor& acceptor) {

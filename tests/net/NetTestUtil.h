@@ -92,7 +92,8 @@ struct RawFrame {
 /// is bounded by a deadline.
 class RawClient {
  public:
-  explicit RawClient(uint16_t port);
+  /// Connects, and greets with `version` unless it is 0.
+  explicit RawClient(uint16_t port, uint16_t version = 0);
   explicit RawClient(asio::ip::tcp::acceptor& acceptor);
   void send(const Bytes& bytes) {
     std::error_code ec;  // the server may already have closed: that is for the reads to show

@@ -173,7 +173,6 @@ TEST(SharedTarget, LimitsTimeoutsAndAServerGoingAway) {
   ZinNet::TcpTransport patient("127.0.0.1", server->port(), {1000, 5000});
   patient.commandSequence("quick", nullptr, 0);
   transport.commandSequence("quick", nullptr, 0);
-  EXPECT_TRUE(transport.isConnected());
   EXPECT_EQ(slow->done, 4);
   EXPECT_EQ(server->server().stats().connectionsAccepted, 3u);
   // A request that waits for the request thread when the server stops is never answered.
