@@ -65,10 +65,7 @@ std::optional<RawFrame> RawClient::readFrame(std::chrono::milliseconds limit) {
   }
   Bytes body(length);
   if (!readExactly(body.data(), length, end)) return std::nullopt;
-  RawFrame got;
-  got.type = body[0];
-  got.body.assign(body.begin() + 1, body.end());
-  return got;
+  return RawFrame{body[0], Bytes(body.begin() + 1, body.end())};
 }
 
 RawFrame RawClient::exchange(const Bytes& request, std::chrono::milliseconds limit) {
@@ -80,8 +77,7 @@ RawFrame RawClient::exchange(const Bytes& request, std::chrono::milliseconds lim
 
 bool RawClient::closedWithin(std::chrono::milliseconds limit) {
   const auto end = std::chrono::steady_clock::now() + limit;
-  while (!ended_ && std::chrono::steady_clock::now() < end) {
-    unsigned char byte = 0;
+  for (unsigned char byte = 0; !ended_ && std::chrono::steady_clock::now() < end;) {
     readExactly(&byte, 1, end);
   }
   return ended_;

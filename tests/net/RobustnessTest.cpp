@@ -10,7 +10,6 @@
 #include <thread>
 
 #include "NetTestUtil.h"
-#include "ZinNet/TcpTransport.h"
 
 namespace {
 

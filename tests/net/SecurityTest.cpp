@@ -5,7 +5,6 @@
 #include <openssl/hmac.h>
 
 #include "NetTestUtil.h"
-#include "ZinNet/TcpTransport.h"
 #include "ZinNet/ZinNet.h"
 #include "ZinRT/ZinJtag.h"
 
@@ -20,9 +19,8 @@ const std::string kToken = "0123456789abcdef-test-token";
 Bytes clientProof(const Bytes& serverNonce, const Bytes& clientNonce) {
   const Bytes message = concat({text("ZNET client"), serverNonce, clientNonce});
   Bytes mac(32);
-  unsigned int length = 0;
   HMAC(EVP_sha256(), kToken.data(), static_cast<int>(kToken.size()), message.data(), message.size(),
-       mac.data(), &length);
+       mac.data(), nullptr);
   return mac;
 }
 
@@ -65,7 +63,6 @@ TEST(Security, NoRequestBeforeTheTokenIsProvenAndNoneWithoutOneBeyondLoopback) {
     EXPECT_EQ(reply.type, kClosing) << reply.text();
   }
   EXPECT_EQ(server.server().stats().tokensRefused, 3u);
-  EXPECT_EQ(server.server().stats().requestsServed, 0u);
   EXPECT_THAT(server.log(), testing::Contains(HasSubstr("refused: wrong token")).Times(2));
   EXPECT_THAT(server.log(), testing::Each(testing::Not(HasSubstr(kToken))));
 
@@ -75,7 +72,7 @@ TEST(Security, NoRequestBeforeTheTokenIsProvenAndNoneWithoutOneBeyondLoopback) {
   EXPECT_THAT(readFailure(options, server.port()), HasSubstr("does not know the token"));
   options.token = kToken;
   EXPECT_EQ(readFailure(options, server.port(), 2), "no failure");
-  EXPECT_EQ(server.server().stats().requestsServed, 2u);
+  EXPECT_EQ(server.server().stats().requestsServed, 2u);  // those two reads, none before
 
   // Only loopback goes without a token, unless insecure.
   ZinNet::ServerOptions wide{.host = "0.0.0.0"};

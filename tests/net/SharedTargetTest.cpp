@@ -9,7 +9,6 @@
 
 #include "NetTestUtil.h"
 #include "ZinMOX/ZinMOX.h"
-#include "ZinNet/TcpTransport.h"
 #include "ZinNet/ZinNet.h"
 #include "ZinRT/ZinJtag.h"
 
@@ -56,9 +55,7 @@ TEST(SharedTarget, ClientsShareOneTargetAndItsFailures) {
   const uint16_t port = server->port();
   Client a(port);
   Client b(port);
-  ASSERT_EQ(ZinMOX_initCore(a.handle, &kFull), ZINMOX_SUCCESS);
-  ASSERT_EQ(ZinMOX_initCore(b.handle, &kFull), ZINMOX_SUCCESS);
-
+  for (Client* c : {&a, &b}) ASSERT_EQ(ZinMOX_initCore(c->handle, &kFull), ZINMOX_SUCCESS);
   ASSERT_EQ(a.write("async_out_data", "A5C3"), ZINMOX_SUCCESS);
   EXPECT_EQ(target->asyncOutputLevels(kFull), "1100001110100101");
   EXPECT_EQ(b.read()["async_in_data"], "A5C3");
@@ -71,14 +68,12 @@ TEST(SharedTarget, ClientsShareOneTargetAndItsFailures) {
   EXPECT_TRUE(b.takeMessages().empty());
   EXPECT_EQ(target->flushCount(), 2u);
   EXPECT_GE(server->server().stats().requestsServed, 6u);  // each write is one request
-
   // A target failure keeps the connection.
   target->failNextTransfer("ZinSim test: cable unplugged");
   EXPECT_EQ(a.write("async_out_data", "FFFF"), ZINMOX_FAILURE);
   EXPECT_EQ(a.takeMessages(), std::vector<std::string>{"ZinSim test: cable unplugged"});
   EXPECT_EQ(a.write("async_out_data", "0001"), ZINMOX_SUCCESS);
   EXPECT_EQ(server->server().stats().connectionsAccepted, 2u);
-
   auto transport = std::make_shared<ZinNet::TcpTransport>("127.0.0.1", port);
   std::vector<ZIN_CORE_REF> refs;
   ASSERT_TRUE(transport->listCores(refs));
@@ -101,7 +96,6 @@ TEST(SharedTarget, ClientsShareOneTargetAndItsFailures) {
   EXPECT_EQ(ZinNet_openSession(nullptr, port, 500), 0u);
   EXPECT_EQ(ZinNet_openSession("127.0.0.1", 0, 500), 0u);
   EXPECT_STREQ(ZinNet_lastError(), "ZinNet_openSession: port 0");
-
   server.reset();  // the server goes away: the call in progress fails, and so does an open
   EXPECT_EQ(ZinNet_openSession("127.0.0.1", port, 500), 0u);
   EXPECT_THAT(ZinNet_lastError(), HasSubstr("cannot connect to 127.0.0.1:"));
@@ -199,8 +193,8 @@ TEST(Interleave, ConcurrentClientsSequencesNeverInterleave) {
   auto recorder = std::make_shared<RecordingTransport>();
   TestServer server(recorder);
   constexpr int kClients = 6, kSequences = 40;
-  const auto sequence = [](int c,
-                           int i) {  // every third one is over 64 KiB, for the request thread
+  // A multi-line sequence; every third one is over 64 KiB, for the request thread.
+  const auto sequence = [](int c, int i) {
     std::string text;
     for (int line = 0; line < (i % 3 == 0 ? 600 : 50); ++line) {
       text += "client " + std::to_string(c) + " sequence " + std::to_string(i) + " line " +
