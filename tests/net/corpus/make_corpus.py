@@ -2,8 +2,8 @@
 """Writes the byte files of the server's fuzz corpus (run from this folder).
 
 Each file is what one client sends from connect to the end of its stream. The test
-RobustnessTest.TheFuzzCorpusNeverCrashesOrHangsTheServer sends each file, and mutations of them,
-and checks that the server answers or closes, and keeps serving."""
+Robustness.UntrustedBytesAreAnsweredRefusedOrClosedAtTheirLimits sends each file, and mutations
+of them, and checks that the server answers or closes, and keeps serving."""
 import struct
 
 READ = b"00 1 0 03 1 00000098 0\n00 1 0 04 1 00000004 0"
