@@ -119,10 +119,8 @@ class RecordingTransport : public ZinRT::Zin_Transport {
   void commandSequence(const std::string& text, unsigned char* data, uint32_t bits) override {
     if (inside_.fetch_add(1) != 0) ++overlaps;
     std::this_thread::sleep_for(std::chrono::microseconds(text == "slow" ? 400000 : 200));
-    {
-      std::lock_guard<std::mutex> lock(mutex_);
-      texts.push_back(text);
-    }
+    std::lock_guard<std::mutex> lock(mutex_);
+    texts.push_back(text);
     // Answer with the text's last byte in every read byte, so clients can check their answer.
     for (uint32_t i = 0; i < (bits + 7) / 8; ++i) data[i] = static_cast<unsigned char>(text.back());
     --inside_;
