@@ -1,7 +1,5 @@
-// zinmox-rtlsim with OpenOCD attached, on free loopback ports and always stopped: the exported
-// functions through the hub transport give the simulated target's results, and every fault (no
-// OpenOCD, OpenOCD or the model dying mid-call, a board that does not match, an empty chain, a
-// corrupted scan, a silent server, junk and vanishing bit-bang clients) is a clear error.
+// zinmox-rtlsim with OpenOCD attached on free loopback ports: the exported functions through the
+// hub transport give the simulated target's results, and every fault is a clear error.
 #include <gtest/gtest.h>
 #include <netinet/in.h>
 #include <signal.h>
@@ -9,7 +7,6 @@
 #include <unistd.h>
 
 #include <future>
-#include <map>
 #include <sstream>
 #include <thread>
 
@@ -70,8 +67,7 @@ class OpenOcdRig {
     const int fd = openocd_->waitForOutput("tap/device found", kStartMs)
                        ? connectLoopback(tclPort_, kStartMs)
                        : -1;
-    if (fd < 0) openocd_.reset();
-    if (fd >= 0) close(fd);
+    fd < 0 ? openocd_.reset() : void(close(fd));
     return fd >= 0;
   }
   std::unique_ptr<ChildProcess> rtlsim_, openocd_;
@@ -92,6 +88,10 @@ std::string errorOf(F&& call) {
     return e.what();
   }
   return "(no error)";
+}
+::testing::AssertionResult contains(const std::string& text, const std::string& part) {
+  if (text.find(part) != std::string::npos) return ::testing::AssertionSuccess();
+  return ::testing::AssertionFailure() << '"' << text << "\" lacks \"" << part << '"';
 }
 
 // One session and the messages of its last failed call.
@@ -127,14 +127,11 @@ struct Host {
   }
   std::string ports(ZIN_CORE_REF ref, uint8_t async) {
     const uint8_t mask = 0xFF;
-    uint32_t rc = ZinMOX_setPortBits(handle, &ref, &async, &mask, 8, nullptr, nullptr, 0);
-    uint8_t in[3] = {}, sync[5] = {};
-    rc |= ZinMOX_getPortBits(handle, &ref, &in[0], &in[1], &in[2], 8, &sync[0], &sync[1], &sync[2],
-                             &sync[3], &sync[4], 4);
-    std::ostringstream out;
-    out << "rc " << rc << std::hex;
-    for (uint8_t b : in) out << " " << unsigned{b};
-    return out.str();
+    uint8_t in[3] = {}, s[5] = {};
+    const uint32_t rc = ZinMOX_setPortBits(handle, &ref, &async, &mask, 8, nullptr, nullptr, 0) |
+                        ZinMOX_getPortBits(handle, &ref, &in[0], &in[1], &in[2], 8, &s[0], &s[1],
+                                           &s[2], &s[3], &s[4], 4);
+    return "rc " + std::to_string(rc) + " " + std::to_string(in[0] | in[1] << 8 | in[2] << 16);
   }
 };
 
@@ -177,9 +174,7 @@ TEST_F(OpenOcdTest, ExportedFunctionsGiveTheSimulatedTargetsResults) {
   ASSERT_NE(rtl.handle, 0U) << ZinOpenOcd_lastError();
   Host sim(ZinJtag_openSession(std::make_shared<ZinSim::Target>()));
   const std::vector<std::string> got = exercise(rtl);
-  const std::vector<std::string> want = exercise(sim);
-  ASSERT_EQ(got.size(), want.size());
-  for (size_t i = 0; i < got.size(); ++i) EXPECT_EQ(got[i], want[i]) << "step " << i;
+  EXPECT_EQ(got, exercise(sim));
   EXPECT_EQ(got[0], "1:0 1:1 1:2 1:3 ");
   EXPECT_EQ(rtl.messages, sim.messages);
 }
@@ -209,7 +204,7 @@ TEST_F(OpenOcdTest, BoardsThatDoNotMatchOpenOcdAreRefusedAtConnect) {
         ZinOpenOcd_openSession("127.0.0.1", static_cast<uint16_t>(rig_.tclPort()), c.board, 2000);
     const std::string error = ZinOpenOcd_lastError();
     EXPECT_EQ(handle == 0, *c.error != '\0') << c.board;
-    EXPECT_NE(error.find(c.error), std::string::npos) << c.board << " -> " << error;
+    EXPECT_TRUE(contains(error, c.error)) << c.board;
     if (handle != 0) ZinJtag_closeSession(handle);
   }
 }
@@ -224,35 +219,28 @@ TEST_F(OpenOcdTest, EmptyChainHasNoCoreAndACorruptedScanFailsItsCheck) {
   transport->readStatus({0, 2, 0}, info, status, 16, 128);
   EXPECT_EQ(info.coreType, 0U);
   std::vector<unsigned char> data(16);
-  EXPECT_NE(errorOf([&] {
-              transport->commandSequence("00 2 0 03 1 00000048 0", data.data(), 128);
-            }).find("no core at 0:2:0"),
-            std::string::npos);
+  EXPECT_TRUE(contains(
+      errorOf([&] { transport->commandSequence("00 2 0 03 1 00000048 0", data.data(), 128); }),
+      "no core at 0:2:0"));
 
   // A TDO bit flipped on the way: the CRC catches it.
-  class Flipping : public ZinHub::JtagEngine {
-   public:
-    explicit Flipping(std::shared_ptr<ZinHub::JtagEngine> inner) : inner_(std::move(inner)) {}
-    void queueIrScan(uint32_t d, uint32_t l, uint64_t i) override { inner_->queueIrScan(d, l, i); }
-    void queueDrScan(uint32_t d, ZinHub::BitVector tdi) override { inner_->queueDrScan(d, tdi); }
+  struct Flipping : ZinHub::OpenOcdEngine {
+    using OpenOcdEngine::OpenOcdEngine;
     std::vector<ZinHub::BitVector> execute() override {
-      auto out = inner_->execute();
+      auto out = OpenOcdEngine::execute();
       out.back()[40] ^= 1;
       return out;
     }
-    std::shared_ptr<ZinHub::JtagEngine> inner_;
   };
-  auto engine =
-      std::make_shared<ZinHub::OpenOcdEngine>("127.0.0.1", rig_.tclPort(), ZinHub::rtlModelBoard());
-  ZinHub::HubTransport corrupted(std::make_shared<Flipping>(engine));
-  EXPECT_NE(errorOf([&] {
-              corrupted.readStatus({0, 1, 0}, info, status, 16, 128);
-            }).find("integrity failure"),
-            std::string::npos);
-  EXPECT_NE(errorOf([&] {
-              corrupted.commandSequence("00 1 1 03 1 00000048 0", data.data(), 128);
-            }).find("CRC"),
-            std::string::npos);
+  ZinHub::HubTransport corrupted(std::make_shared<Flipping>(
+      "127.0.0.1", static_cast<uint16_t>(rig_.tclPort()), ZinHub::rtlModelBoard()));
+  EXPECT_TRUE(contains(errorOf([&] {
+                         corrupted.readStatus({0, 1, 0}, info, status, 16, 128);
+                       }),
+                       "integrity failure"));
+  EXPECT_TRUE(contains(
+      errorOf([&] { corrupted.commandSequence("00 1 1 03 1 00000048 0", data.data(), 128); }),
+      "CRC"));
 }
 
 // Capture lines, so that a process can die while a sequence runs.
@@ -282,9 +270,7 @@ TEST_F(OpenOcdTest, DeathMidCallFailsThatCallAndTheNextCallReconnects) {
     std::this_thread::sleep_for(std::chrono::milliseconds(300));
     rig_.kill(model ? rig_.rtlsim_ : rig_.openocd_);
     const std::string error = calls.get();
-    EXPECT_NE(error.find("OpenOCD at 127.0.0.1:" + std::to_string(rig_.tclPort())),
-              std::string::npos)
-        << error;
+    EXPECT_TRUE(contains(error, "OpenOCD at 127.0.0.1:" + std::to_string(rig_.tclPort())));
     ASSERT_TRUE(rig_.restart()) << rig_.log();
     info = {};
     transport->readStatus({0, 1, 1}, info, status, 16, 128);
@@ -295,10 +281,8 @@ TEST_F(OpenOcdTest, DeathMidCallFailsThatCallAndTheNextCallReconnects) {
 TEST(OpenOcdFaults, NoOpenOcdOrASilentOneIsAClearErrorWithinTheTimeout) {
   const int port = freeLoopbackPort();
   EXPECT_EQ(ZinOpenOcd_openSession("127.0.0.1", static_cast<uint16_t>(port), nullptr, 500), 0U);
-  EXPECT_NE(std::string(ZinOpenOcd_lastError())
-                .find("OpenOCD at 127.0.0.1:" + std::to_string(port) + ": cannot connect"),
-            std::string::npos)
-      << ZinOpenOcd_lastError();
+  EXPECT_TRUE(contains(ZinOpenOcd_lastError(),
+                       "OpenOCD at 127.0.0.1:" + std::to_string(port) + ": cannot connect"));
 
   // A port that accepts connections and never answers.
   const int fd = socket(AF_INET, SOCK_STREAM, 0);
@@ -311,8 +295,8 @@ TEST(OpenOcdFaults, NoOpenOcdOrASilentOneIsAClearErrorWithinTheTimeout) {
   getsockname(fd, reinterpret_cast<sockaddr*>(&address), &length);
   const std::string target =
       "openocd://127.0.0.1:" + std::to_string(ntohs(address.sin_port)) + "?timeout=300";
-  EXPECT_NE(errorOf([&] { ZinHub::openOpenOcd(parse(target)); }).find("no answer within 300 ms"),
-            std::string::npos);
+  EXPECT_TRUE(
+      contains(errorOf([&] { ZinHub::openOpenOcd(parse(target)); }), "no answer within 300 ms"));
   close(fd);
 }
 
@@ -345,7 +329,7 @@ TEST(OpenOcdFaults, RtlsimSurvivesJunkAndVanishingClients) {
   close(fd);
   rtlsim->signal(SIGTERM);
   EXPECT_EQ(rtlsim->wait(kStartMs), 0) << rtlsim->output();
-  EXPECT_NE(rtlsim->output().find("stopped (signal)"), std::string::npos);
+  EXPECT_TRUE(contains(rtlsim->output(), "stopped (signal)"));
   EXPECT_EQ(ChildProcess(ZINMOX_RTLSIM_PATH, {"--help"}).wait(kStartMs), 0);
   EXPECT_EQ(ChildProcess(ZINMOX_RTLSIM_PATH, {"--clock-ratio", "3/0"}).wait(kStartMs), 2);
 }
@@ -353,9 +337,8 @@ TEST(OpenOcdFaults, RtlsimSurvivesJunkAndVanishingClients) {
 TEST(OpenOcdFaults, MalformedTargetTexts) {
   for (const char* text : {"openocd://", "openocd://host", "openocd://h:0", "openocd://h:70000",
                            "openocd://h:1?timeout=0", "openocd://h:1?speed=3", "openocd://a;b:1"}) {
-    EXPECT_NE(errorOf([&] { ZinHub::parseOpenOcdTarget(text); }).find("malformed OpenOCD target"),
-              std::string::npos)
-        << text;
+    EXPECT_TRUE(
+        contains(errorOf([&] { ZinHub::parseOpenOcdTarget(text); }), "malformed OpenOCD target"));
   }
   const ZinHub::OpenOcdTarget t = parse("openocd://[::1]:6666?board=ecp5&timeout=250");
   EXPECT_EQ(t.host, "::1");

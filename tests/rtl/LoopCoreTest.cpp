@@ -19,10 +19,10 @@ struct Levels {
 Image image(uint32_t async, uint32_t asyncMarks, const std::vector<uint16_t>& trains,
             uint32_t syncMarks) {
   Image im;
+  im.trains = trains;
   for (int i = 0; i < 8; ++i) {
     im.asyncValue.push_back((async >> i) & 1u);
     im.asyncMark.push_back((asyncMarks >> i) & 1u);
-    im.trains.push_back(trains[static_cast<size_t>(i)]);
     im.syncMark.push_back((syncMarks >> i) & 1u);
   }
   return im;
@@ -31,17 +31,14 @@ Image image(uint32_t async, uint32_t asyncMarks, const std::vector<uint16_t>& tr
 class LoopCore : public ::testing::Test {
  protected:
   explicit LoopCore(ClockPlan plan = {1, 40, 0, 1}) : bench_(plan), hub_(bench_, waitBits(plan)) {
-    bench_.onClockEdge([this](Vzinmox_loop_top& m) {
-      trace_.push_back({m.async_out_o, m.sync_out_o});
-    });
+    bench_.onClockEdge([this](auto& m) { trace_.push_back({m.async_out_o, m.sync_out_o}); });
     bench_.resetTap();
     bench_.ir(0x8);
   }
   // The edge at which the async outputs last changed to `value`.
   size_t edgeOf(uint32_t value) const {
-    for (size_t e = trace_.size(); e-- > 1;) {
+    for (size_t e = trace_.size(); e-- > 1;)
       if (trace_[e].async == value && trace_[e - 1].async != value) return e;
-    }
     return SIZE_MAX;
   }
   void commit() { ASSERT_EQ(hub_.result(kCommit, 0), 1); }
