@@ -128,9 +128,9 @@ struct Host {
   std::string ports(ZIN_CORE_REF ref, uint8_t async) {
     const uint8_t mask = 0xFF;
     uint8_t in[3] = {}, s[5] = {};
-    const uint32_t rc = ZinMOX_setPortBits(handle, &ref, &async, &mask, 8, nullptr, nullptr, 0) |
-                        ZinMOX_getPortBits(handle, &ref, &in[0], &in[1], &in[2], 8, &s[0], &s[1],
-                                           &s[2], &s[3], &s[4], 4);
+    uint32_t rc = ZinMOX_setPortBits(handle, &ref, &async, &mask, 8, nullptr, nullptr, 0);
+    rc |= ZinMOX_getPortBits(handle, &ref, &in[0], &in[1], &in[2], 8, &s[0], &s[1], &s[2], &s[3],
+                             &s[4], 4);
     return "rc " + std::to_string(rc) + " " + std::to_string(in[0] | in[1] << 8 | in[2] << 16);
   }
 };
@@ -150,16 +150,14 @@ std::vector<std::string> exercise(Host& host) {
   ZinMOX_defineSignal(host.handle, &ref, "sin", ZINMOX_SYNC_INPUT, 0);
   host.call(ZinMOX_writeValues, ref, {{"out", "00"}, {"s.pulsetrain", "0000"}});
   host.call(ZinMOX_readValues, ref);  // clears what earlier runs left in the latches
-  for (const char* value : {"5A", "0F", "F0"}) {
-    out.push_back(host.call(ZinMOX_writeValues, ref, {{"out", value}}));
+  const auto writeRead = [&](const char* name, const char* value) {
+    out.push_back(host.call(ZinMOX_writeValues, ref, {{name, value}}));
     out.push_back(host.call(ZinMOX_readValues, ref));
-  }
+  };
+  for (const char* value : {"5A", "0F", "F0"}) writeRead("out", value);
   out.push_back(host.ports(ref, 0xC3));
   out.push_back(host.ports(ref, 0x3C));
-  for (const char* train : {"FFFF", "0000"}) {
-    out.push_back(host.call(ZinMOX_writeValues, ref, {{"s.pulsetrain", train}}));
-    out.push_back(host.call(ZinMOX_readValues, ref));
-  }
+  for (const char* train : {"FFFF", "0000"}) writeRead("s.pulsetrain", train);
   return out;
 }
 
@@ -243,16 +241,11 @@ TEST_F(OpenOcdTest, EmptyChainHasNoCoreAndACorruptedScanFailsItsCheck) {
       "CRC"));
 }
 
-// Capture lines, so that a process can die while a sequence runs.
-constexpr int kLines = 1000;
-std::string longSequence() {
-  std::string text;
-  for (int i = 0; i < kLines; ++i) text += std::string(i ? "\n" : "") + "00 1 1 03 1 00000048 0";
-  return text;
-}
-
 TEST_F(OpenOcdTest, DeathMidCallFailsThatCallAndTheNextCallReconnects) {
   auto transport = ZinHub::openOpenOcd(parse(rig_.target("?timeout=5000")));
+  constexpr int kLines = 1000;  // capture lines, so that a process can die while a sequence runs
+  std::string text = "00 1 1 03 1 00000048 0";
+  for (int i = 1; i < kLines; ++i) text += "\n00 1 1 03 1 00000048 0";
   std::vector<unsigned char> data(kLines * 9);
   ZIN_CORE_INFO info{};
   unsigned char status[16] = {};
@@ -261,10 +254,8 @@ TEST_F(OpenOcdTest, DeathMidCallFailsThatCallAndTheNextCallReconnects) {
     auto calls = std::async(std::launch::async, [&] {
       const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(20);
       std::string error = "(no error)";
-      while (error == "(no error)" && std::chrono::steady_clock::now() < end) {
-        error =
-            errorOf([&] { transport->commandSequence(longSequence(), data.data(), kLines * 72); });
-      }
+      while (error == "(no error)" && std::chrono::steady_clock::now() < end)
+        error = errorOf([&] { transport->commandSequence(text, data.data(), kLines * 72); });
       return error;
     });
     std::this_thread::sleep_for(std::chrono::milliseconds(300));
@@ -272,7 +263,7 @@ TEST_F(OpenOcdTest, DeathMidCallFailsThatCallAndTheNextCallReconnects) {
     const std::string error = calls.get();
     EXPECT_TRUE(contains(error, "OpenOCD at 127.0.0.1:" + std::to_string(rig_.tclPort())));
     ASSERT_TRUE(rig_.restart()) << rig_.log();
-    info = {};
+    info = {};  // the next call reconnects
     transport->readStatus({0, 1, 1}, info, status, 16, 128);
     EXPECT_EQ(info.coreType, 9U) << (model ? "after the model died" : "after OpenOCD died");
   }
@@ -286,13 +277,10 @@ TEST(OpenOcdFaults, NoOpenOcdOrASilentOneIsAClearErrorWithinTheTimeout) {
 
   // A port that accepts connections and never answers.
   const int fd = socket(AF_INET, SOCK_STREAM, 0);
-  sockaddr_in address{};
-  address.sin_family = AF_INET;
-  address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+  sockaddr_in address{AF_INET, 0, {htonl(INADDR_LOOPBACK)}, {}};
   socklen_t length = sizeof address;
-  ASSERT_EQ(bind(fd, reinterpret_cast<sockaddr*>(&address), sizeof address), 0);
-  ASSERT_EQ(listen(fd, 4), 0);
-  getsockname(fd, reinterpret_cast<sockaddr*>(&address), &length);
+  ASSERT_EQ(bind(fd, reinterpret_cast<sockaddr*>(&address), length), 0);
+  ASSERT_EQ(listen(fd, 4) | getsockname(fd, reinterpret_cast<sockaddr*>(&address), &length), 0);
   const std::string target =
       "openocd://127.0.0.1:" + std::to_string(ntohs(address.sin_port)) + "?timeout=300";
   EXPECT_TRUE(
