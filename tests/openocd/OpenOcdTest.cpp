@@ -7,7 +7,6 @@
 #include <unistd.h>
 
 #include <future>
-#include <sstream>
 #include <thread>
 
 #include "ZinHub/BoardFile.h"
@@ -112,10 +111,9 @@ struct Host {
   std::string call(uint32_t (*function)(uint32_t, ZIN_CORE_REF*, uintptr_t*), ZIN_CORE_REF ref,
                    ZinMOX_ValueMap values = {}) {
     uintptr_t word = reinterpret_cast<uintptr_t>(&values);
-    std::ostringstream out;
-    out << "rc " << function(handle, &ref, &word);
-    for (const auto& [key, value] : values) out << " " << key << "=" << value;
-    return out.str();
+    std::string out = "rc " + std::to_string(function(handle, &ref, &word));
+    for (const auto& [key, value] : values) out += " " + key + "=" + value;
+    return out;
   }
   std::string scan() {
     std::vector<ZIN_CORE_REF> refs;

@@ -127,9 +127,6 @@ enum Op : uint32_t { kHubInfo = 0, kCommit = 2, kCapture = 3, kClear = 4, kStatu
 inline uint64_t number(const Bits& bits, size_t first, size_t length) {
   return ZinHub::readNumber(bits, first, static_cast<unsigned>(length));
 }
-inline bool crcOk(const Bits& bits, size_t first, size_t length) {
-  return ZinHub::crc16(bits, first, length + 16) == 0;
-}
 
 // An output image for a stage scan.
 struct Image {
@@ -183,7 +180,7 @@ class HubClient {
   // A record read (hub info or core status) with its CRC checked.
   Bits record(uint32_t op, uint32_t core, size_t length) {
     const Bits out = scan(op, core, Bits(length + 16, 0));
-    if (!crcOk(out, 16, length)) throw std::runtime_error("record CRC mismatch");
+    if (ZinHub::crc16(out, 16, length + 16) != 0) throw std::runtime_error("record CRC mismatch");
     return Bits(out.begin() + 16, out.begin() + 16 + static_cast<long>(length));
   }
 
@@ -210,7 +207,7 @@ class HubClient {
   std::vector<InputReading> capture(uint32_t core, size_t a, size_t s) {
     const size_t n = 4 * a + 6 * s;
     const auto reply = request(kCapture, core, n + 16);
-    if (!reply || !crcOk(*reply, 0, n))
+    if (!reply || ZinHub::crc16(*reply, 0, n + 16) != 0)
       throw std::runtime_error("capture: no start bit or bad CRC");
     const auto b = [&](size_t k) { return (*reply)[n - 1 - k] != 0; };
     std::vector<InputReading> r;
