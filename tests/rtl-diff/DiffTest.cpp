@@ -45,10 +45,9 @@ struct Widths {
   unsigned asyncOut, syncOut, asyncIn, syncIn;
 };
 
-template <class Value>
-std::string levelText(Value port, unsigned width) {
+std::string levelText(uint64_t port, unsigned width) {
   std::string text(width, '0');
-  for (unsigned i = 0; i < width; ++i) text[i] = ((uint64_t{port} >> i) & 1U) != 0 ? '1' : '0';
+  for (unsigned i = 0; i < width; ++i) text[i] = ((port >> i) & 1U) != 0 ? '1' : '0';
   return text;
 }
 
@@ -75,22 +74,15 @@ struct Sequence {
   uint32_t readBits = 0;
 };
 
-// Random command sequences for one core, in the library's line format: stage + commit, stage,
+// A random command sequence for one core, in the library's line format: stage + commit, stage,
 // commit, capture + clear, capture, or clear.
-struct SequenceSource {
-  Sequence next() {
-    const int pick = std::uniform_int_distribution<int>(0, 9)(rng);
-    const uint32_t capture = 4 * widths.asyncIn + 6 * widths.syncIn + 16;
-    const std::string commit = "00 1 0 02 0 00000004 0", clear = "00 1 0 04 1 00000004 0";
-    const std::string read = "00 1 0 03 1 " + hex8(capture) + " 0";
-    const uint32_t readBits = (capture + 7) / 8 * 8;
-    if (pick < 4) return {stageLine() + "\n" + commit};
-    if (pick == 4) return {stageLine()};
-    if (pick == 5) return {commit};
-    if (pick < 8) return {read + "\n" + clear, readBits + 8};
-    return pick == 8 ? Sequence{read, readBits} : Sequence{clear, 8};
-  }
-  std::string stageLine() {
+Sequence randomSequence(const Widths& widths, std::mt19937_64& rng) {
+  const int pick = std::uniform_int_distribution<int>(0, 9)(rng);
+  const uint32_t capture = 4 * widths.asyncIn + 6 * widths.syncIn + 16;
+  const std::string commit = "00 1 0 02 0 00000004 0", clear = "00 1 0 04 1 00000004 0";
+  const std::string read = "00 1 0 03 1 " + hex8(capture) + " 0";
+  const uint32_t readBits = (capture + 7) / 8 * 8;
+  const auto stageLine = [&] {
     const size_t bits = 2 * widths.asyncOut + 17 * widths.syncOut;  // the number's low L-1 bits
     std::string hex((bits + 3) / 4, '0');
     for (size_t digit = 0; digit < hex.size(); ++digit) {
@@ -98,11 +90,13 @@ struct SequenceSource {
       hex[hex.size() - 1 - digit] = "0123456789ABCDEF"[rng() & ((1U << valid) - 1)];
     }
     return "00 1 0 01 0 " + hex8(bits + 1) + " " + hex;
-  }
-
-  Widths widths;
-  std::mt19937_64 rng;
-};
+  };
+  if (pick < 4) return {stageLine() + "\n" + commit};
+  if (pick == 4) return {stageLine()};
+  if (pick == 5) return {commit};
+  if (pick < 8) return {read + "\n" + clear, readBits + 8};
+  return pick == 8 ? Sequence{read, readBits} : Sequence{clear, 8};
+}
 
 // One configuration: the verilated loopback design behind the hub transport over the pin-level
 // engine, against its simulated twin.
@@ -120,9 +114,9 @@ void runPair(Widths widths, ZinRtl::ClockRatio ratio) {
   ASSERT_EQ(cores.size(), 1U);
 
   const uint64_t count = envNumber("ZINMOX_RTL_DIFF_SEQUENCES", 150);
-  SequenceSource source{widths, std::mt19937_64(envNumber("ZINMOX_RTL_DIFF_SEED", 1))};
+  std::mt19937_64 rng(envNumber("ZINMOX_RTL_DIFF_SEED", 1));
   for (uint64_t n = 0; n < count; ++n) {
-    const Sequence sequence = source.next();
+    const Sequence sequence = randomSequence(widths, rng);
     const uint32_t bits = sequence.readBits;
     std::vector<unsigned char> simData(bits / 8 + 1), rtlData(bits / 8 + 1);
     sim->commandSequence(sequence.text, simData.data(), bits);

@@ -42,8 +42,6 @@ class PinBench : public ZinHub::JtagPins {
     m_.rst_ni = m_.trst_ni = 1;
     m_.eval();
   }
-  PinBench(const PinBench&) = delete;
-  PinBench& operator=(const PinBench&) = delete;
   ~PinBench() override { m_.final(); }
 
   // Called after every rising edge of the design clock.
