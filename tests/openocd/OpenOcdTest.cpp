@@ -32,8 +32,7 @@ int startRtlsim(std::unique_ptr<ChildProcess>& child, const std::string& idleTim
   return port.empty() ? -1 : std::stoi(port);
 }
 
-// The model and OpenOCD attached to it; either can be killed and started again (OpenOCD keeps
-// its Tcl port).
+// The model and OpenOCD attached to it; either can be killed and restarted (same Tcl port).
 class OpenOcdRig {
  public:
   OpenOcdRig() : tclPort_(freeLoopbackPort()) { restart(); }
@@ -91,6 +90,14 @@ std::string errorOf(F&& call) {
 ::testing::AssertionResult contains(const std::string& text, const std::string& part) {
   if (text.find(part) != std::string::npos) return ::testing::AssertionSuccess();
   return ::testing::AssertionFailure() << '"' << text << "\" lacks \"" << part << '"';
+}
+
+// The core type a status read reports.
+uint32_t coreType(ZinRT::Zin_Transport& transport, ZIN_CORE_REF ref) {
+  ZIN_CORE_INFO info{};
+  unsigned char status[16] = {};
+  transport.readStatus(ref, info, status, 16, 128);
+  return info.coreType;
 }
 
 // One session and the messages of its last failed call.
@@ -207,10 +214,7 @@ TEST_F(OpenOcdTest, EmptyChainHasNoCoreAndACorruptedScanFailsItsCheck) {
   std::vector<ZIN_CORE_REF> refs;
   transport->listCores(refs);
   EXPECT_EQ(refs.size(), 4U);  // chains 2 to 4 select BYPASS: no hub, no cores
-  ZIN_CORE_INFO info{};
-  unsigned char status[16] = {};
-  transport->readStatus({0, 2, 0}, info, status, 16, 128);
-  EXPECT_EQ(info.coreType, 0U);
+  EXPECT_EQ(coreType(*transport, {0, 2, 0}), 0U);
   std::vector<unsigned char> data(16);
   EXPECT_TRUE(contains(
       errorOf([&] { transport->commandSequence("00 2 0 03 1 00000048 0", data.data(), 128); }),
@@ -227,10 +231,7 @@ TEST_F(OpenOcdTest, EmptyChainHasNoCoreAndACorruptedScanFailsItsCheck) {
   };
   ZinHub::HubTransport corrupted(std::make_shared<Flipping>(
       "127.0.0.1", static_cast<uint16_t>(rig_.tclPort()), ZinHub::rtlModelBoard()));
-  EXPECT_TRUE(contains(errorOf([&] {
-                         corrupted.readStatus({0, 1, 0}, info, status, 16, 128);
-                       }),
-                       "integrity failure"));
+  EXPECT_TRUE(contains(errorOf([&] { coreType(corrupted, {0, 1, 0}); }), "integrity failure"));
   EXPECT_TRUE(contains(
       errorOf([&] { corrupted.commandSequence("00 1 1 03 1 00000048 0", data.data(), 128); }),
       "CRC"));
@@ -242,8 +243,6 @@ TEST_F(OpenOcdTest, DeathMidCallFailsThatCallAndTheNextCallReconnects) {
   std::string text = "00 1 1 03 1 00000048 0";
   for (int i = 1; i < kLines; ++i) text += "\n00 1 1 03 1 00000048 0";
   std::vector<unsigned char> data(kLines * 9);
-  ZIN_CORE_INFO info{};
-  unsigned char status[16] = {};
   for (const bool model : {false, true}) {
     // Sequences back to back until one fails: the kill lands in the middle of one.
     auto calls = std::async(std::launch::async, [&] {
@@ -258,9 +257,8 @@ TEST_F(OpenOcdTest, DeathMidCallFailsThatCallAndTheNextCallReconnects) {
     const std::string error = calls.get();
     EXPECT_TRUE(contains(error, "OpenOCD at 127.0.0.1:" + std::to_string(rig_.tclPort())));
     ASSERT_TRUE(rig_.restart()) << rig_.log();
-    info = {};  // the next call reconnects
-    transport->readStatus({0, 1, 1}, info, status, 16, 128);
-    EXPECT_EQ(info.coreType, 9U) << (model ? "after the model died" : "after OpenOCD died");
+    EXPECT_EQ(coreType(*transport, {0, 1, 1}), 9U)  // the next call reconnects
+        << (model ? "after the model died" : "after OpenOCD died");
   }
 }
 

@@ -30,8 +30,7 @@ uint64_t envNumber(const char* name, uint64_t fallback) {
   return text != nullptr && *text != '\0' ? std::strtoull(text, nullptr, 10) : fallback;
 }
 
-// The information fields and the status word from bit 40 (below it the record carries the
-// information) agree.
+// The information fields agree, and so does the status word from record bit 40 on.
 void expectSameStatus(ZinRT::Zin_Transport& sim, ZinRT::Zin_Transport& rtl) {
   ZIN_CORE_INFO info[2] = {};
   unsigned char status[2][16] = {};
@@ -98,8 +97,7 @@ Sequence randomSequence(const Widths& widths, std::mt19937_64& rng) {
   return pick == 8 ? Sequence{read, readBits} : Sequence{clear, 8};
 }
 
-// One configuration: the verilated loopback design behind the hub transport over the pin-level
-// engine, against its simulated twin.
+// The verilated loopback design behind the hub transport, against its simulated twin.
 template <class Model>
 void runPair(Widths widths, ZinRtl::ClockRatio ratio) {
   VerilatedContext context;

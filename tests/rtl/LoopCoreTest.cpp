@@ -1,6 +1,5 @@
-// One 8/8/8/8 MOX core with its outputs on pins: pulse trains cycle by cycle, a restage during
-// play and update marks. (Random writes against a model of the outputs and the activity they
-// leave are the differential test's, tests/rtl-diff.)
+// One 8/8/8/8 MOX core with its outputs on pins: pulse trains cycle by cycle and a restage during
+// play. (Random writes with update marks are the differential test's, tests/rtl-diff.)
 #include <gtest/gtest.h>
 
 #include "PinBench.h"

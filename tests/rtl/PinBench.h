@@ -126,7 +126,6 @@ inline uint64_t number(const Bits& bits, size_t first, size_t length) {
   return ZinHub::readNumber(bits, first, static_cast<unsigned>(length));
 }
 
-// An output image for a stage scan.
 struct Image {
   std::vector<bool> asyncValue, asyncMark, syncMark;
   std::vector<uint16_t> trains;  // bit t = step t
@@ -161,7 +160,6 @@ class HubClient {
  public:
   HubClient(Bench& bench, size_t waitBits) : bench_(bench), wait_(waitBits) {}
 
-  // One DR scan of the given TDI bits; returns everything TDO gave.
   Bits raw(const Bits& in, size_t stopAfter = SIZE_MAX) {
     Bits out = bench_.dr(in, stopAfter);
     last_ = ZinHub::parseCaptureWord(out);
