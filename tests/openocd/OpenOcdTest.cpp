@@ -37,7 +37,7 @@ class OpenOcdRig {
  public:
   OpenOcdRig() : tclPort_(freeLoopbackPort()) { restart(); }
   bool ok() const { return openocd_ != nullptr; }
-  int tclPort() const { return tclPort_; }
+  uint16_t tclPort() const { return static_cast<uint16_t>(tclPort_); }
   std::string target(const std::string& options = "") const {
     return "openocd://127.0.0.1:" + std::to_string(tclPort_) + options;
   }
@@ -173,7 +173,7 @@ class OpenOcdTest : public ::testing::Test {
 };
 
 TEST_F(OpenOcdTest, ExportedFunctionsGiveTheSimulatedTargetsResults) {
-  Host rtl(ZinOpenOcd_openSession("127.0.0.1", static_cast<uint16_t>(rig_.tclPort()), nullptr, 0));
+  Host rtl(ZinOpenOcd_openSession("127.0.0.1", rig_.tclPort(), nullptr, 0));
   ASSERT_NE(rtl.handle, 0U) << ZinOpenOcd_lastError();
   Host sim(ZinJtag_openSession(std::make_shared<ZinSim::Target>()));
   const std::vector<std::string> got = exercise(rtl);
@@ -201,8 +201,7 @@ TEST_F(OpenOcdTest, BoardsThatDoNotMatchOpenOcdAreRefusedAtConnect) {
       {"xilinx-7series", "has no TAP named xc7.tap"},
   };
   for (const auto& [board, error] : cases) {
-    const uint32_t handle =
-        ZinOpenOcd_openSession("127.0.0.1", static_cast<uint16_t>(rig_.tclPort()), board, 2000);
+    const uint32_t handle = ZinOpenOcd_openSession("127.0.0.1", rig_.tclPort(), board, 2000);
     EXPECT_EQ(handle == 0, *error != '\0') << board;
     EXPECT_TRUE(contains(ZinOpenOcd_lastError(), error)) << board;
     if (handle != 0) ZinJtag_closeSession(handle);
@@ -229,8 +228,8 @@ TEST_F(OpenOcdTest, EmptyChainHasNoCoreAndACorruptedScanFailsItsCheck) {
       return out;
     }
   };
-  ZinHub::HubTransport corrupted(std::make_shared<Flipping>(
-      "127.0.0.1", static_cast<uint16_t>(rig_.tclPort()), ZinHub::rtlModelBoard()));
+  ZinHub::HubTransport corrupted(
+      std::make_shared<Flipping>("127.0.0.1", rig_.tclPort(), ZinHub::rtlModelBoard()));
   EXPECT_TRUE(contains(errorOf([&] { coreType(corrupted, {0, 1, 0}); }), "integrity failure"));
   EXPECT_TRUE(contains(
       errorOf([&] { corrupted.commandSequence("00 1 1 03 1 00000048 0", data.data(), 128); }),
