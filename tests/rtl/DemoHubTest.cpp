@@ -74,7 +74,7 @@ TEST_F(DemoHub, DiscoveryAndStatusRecords) {
   bench_.resetTap();
   EXPECT_EQ(number(bench_.dr(Bits(32, 0)), 0, 32), 0x1A5E0A5Bu);  // IDCODE after reset
   bench_.ir(kUser1);
-  const Bits info = hub_.record(kHubInfo, 0, 32);
+  const Bits info = hub_.record(kInfo, 0, 32);
   EXPECT_TRUE(hub_.lastCaptureWord().hub);  // pattern 0x5A and version 1
   EXPECT_EQ(number(info, 0, 8), 1u);
   EXPECT_EQ(number(info, 8, 5), 4u);
@@ -99,7 +99,7 @@ TEST_F(DemoHub, DiscoveryAndStatusRecords) {
   // A chain without a hub, and BYPASS, never show the capture pattern.
   for (uint32_t ir : {kUser2, kBypass}) {
     bench_.ir(ir);
-    hub_.scan(kHubInfo, 0, Bits(48, 1));
+    hub_.scan(kInfo, 0, Bits(48, 1));
     EXPECT_FALSE(hub_.lastCaptureWord().hub) << "IR " << ir;
   }
 }

@@ -120,7 +120,8 @@ class PinBench : public ZinHub::JtagPins {
   std::function<void(Model&)> observer_;
 };
 
-enum Op : uint32_t { kHubInfo = 0, kCommit = 2, kCapture = 3, kClear = 4, kStatus = 5 };
+using Op = ZinHub::HubOp;
+using enum ZinHub::HubOp;
 
 inline uint64_t number(const Bits& bits, size_t first, size_t length) {
   return ZinHub::readNumber(bits, first, static_cast<unsigned>(length));
@@ -165,16 +166,16 @@ class HubClient {
     last_ = ZinHub::parseCaptureWord(out);
     return out;
   }
-  Bits scan(uint32_t op, uint32_t core, const Bits& payload, size_t stopAfter = SIZE_MAX) {
+  Bits scan(Op op, uint32_t core, const Bits& payload, size_t stopAfter = SIZE_MAX) {
     Bits in;
-    ZinHub::appendHeader(in, static_cast<ZinHub::HubOp>(op), core);
+    ZinHub::appendHeader(in, op, core);
     in.insert(in.end(), payload.begin(), payload.end());
     return raw(in, stopAfter);
   }
   const ZinHub::CaptureWord& lastCaptureWord() const { return last_; }
 
   // A record read (hub info or core status) with its CRC checked.
-  Bits record(uint32_t op, uint32_t core, size_t length) {
+  Bits record(Op op, uint32_t core, size_t length) {
     const Bits out = scan(op, core, Bits(length + 16, 0));
     if (ZinHub::crc16(out, 16, length + 16) != 0) throw std::runtime_error("record CRC mismatch");
     return Bits(out.begin() + 16, out.begin() + 16 + static_cast<long>(length));
@@ -186,7 +187,7 @@ class HubClient {
   void stage(uint32_t core, const Image& image) { raw(stageScan(core, image)); }
 
   // A request op: the reply bits after the start bit, or nothing without a start bit.
-  std::optional<Bits> request(uint32_t op, uint32_t core, size_t replyLength) {
+  std::optional<Bits> request(Op op, uint32_t core, size_t replyLength) {
     const Bits out = scan(op, core, Bits(wait_ + 1 + replyLength, 0));
     const auto at = ZinHub::findReply(out, static_cast<unsigned>(wait_));
     if (!at) return std::nullopt;
@@ -194,7 +195,7 @@ class HubClient {
                 out.begin() + static_cast<long>(*at + replyLength));
   }
   // Commit or clear: the 8-bit result (bit 0 done, bit 1 refused), -1 without an answer.
-  int result(uint32_t op, uint32_t core) {
+  int result(Op op, uint32_t core) {
     const auto reply = request(op, core, 8);
     return reply ? static_cast<int>(number(*reply, 0, 8)) : -1;
   }
