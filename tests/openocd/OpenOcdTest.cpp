@@ -1,7 +1,5 @@
-// zinmox-rtlsim with OpenOCD attached, on free loopback ports and always stopped: the exported
-// functions through the hub transport give the simulated target's results, and every fault (no
-// OpenOCD, OpenOCD or the model dying mid-call, a board that does not match, an empty chain, a
-// corrupted scan, a silent server, junk and vanishing bit-bang clients) is a clear error.
+// zinmox-rtlsim with OpenOCD attached on free loopback ports: the exported functions through the
+// hub transport give the simulated target's results, and every fault is a clear error.
 #include <gtest/gtest.h>
 #include <netinet/in.h>
 #include <signal.h>
@@ -9,8 +7,6 @@
 #include <unistd.h>
 
 #include <future>
-#include <map>
-#include <sstream>
 #include <thread>
 
 #include "ZinHub/BoardFile.h"
@@ -36,13 +32,12 @@ int startRtlsim(std::unique_ptr<ChildProcess>& child, const std::string& idleTim
   return port.empty() ? -1 : std::stoi(port);
 }
 
-// The model and OpenOCD attached to it; either can be killed and started again (OpenOCD keeps
-// its Tcl port).
+// The model and OpenOCD attached to it; either can be killed and restarted (same Tcl port).
 class OpenOcdRig {
  public:
   OpenOcdRig() : tclPort_(freeLoopbackPort()) { restart(); }
   bool ok() const { return openocd_ != nullptr; }
-  int tclPort() const { return tclPort_; }
+  uint16_t tclPort() const { return static_cast<uint16_t>(tclPort_); }
   std::string target(const std::string& options = "") const {
     return "openocd://127.0.0.1:" + std::to_string(tclPort_) + options;
   }
@@ -70,8 +65,7 @@ class OpenOcdRig {
     const int fd = openocd_->waitForOutput("tap/device found", kStartMs)
                        ? connectLoopback(tclPort_, kStartMs)
                        : -1;
-    if (fd < 0) openocd_.reset();
-    if (fd >= 0) close(fd);
+    fd < 0 ? openocd_.reset() : void(close(fd));
     return fd >= 0;
   }
   std::unique_ptr<ChildProcess> rtlsim_, openocd_;
@@ -93,6 +87,18 @@ std::string errorOf(F&& call) {
   }
   return "(no error)";
 }
+::testing::AssertionResult contains(const std::string& text, const std::string& part) {
+  if (text.find(part) != std::string::npos) return ::testing::AssertionSuccess();
+  return ::testing::AssertionFailure() << '"' << text << "\" lacks \"" << part << '"';
+}
+
+// The core type a status read reports.
+uint32_t coreType(ZinRT::Zin_Transport& transport, ZIN_CORE_REF ref) {
+  ZIN_CORE_INFO info{};
+  unsigned char status[16] = {};
+  transport.readStatus(ref, info, status, 16, 128);
+  return info.coreType;
+}
 
 // One session and the messages of its last failed call.
 struct Host {
@@ -112,10 +118,9 @@ struct Host {
   std::string call(uint32_t (*function)(uint32_t, ZIN_CORE_REF*, uintptr_t*), ZIN_CORE_REF ref,
                    ZinMOX_ValueMap values = {}) {
     uintptr_t word = reinterpret_cast<uintptr_t>(&values);
-    std::ostringstream out;
-    out << "rc " << function(handle, &ref, &word);
-    for (const auto& [key, value] : values) out << " " << key << "=" << value;
-    return out.str();
+    std::string out = "rc " + std::to_string(function(handle, &ref, &word));
+    for (const auto& [key, value] : values) out += " " + key + "=" + value;
+    return out;
   }
   std::string scan() {
     std::vector<ZIN_CORE_REF> refs;
@@ -127,14 +132,11 @@ struct Host {
   }
   std::string ports(ZIN_CORE_REF ref, uint8_t async) {
     const uint8_t mask = 0xFF;
+    uint8_t in[3] = {}, s[5] = {};
     uint32_t rc = ZinMOX_setPortBits(handle, &ref, &async, &mask, 8, nullptr, nullptr, 0);
-    uint8_t in[3] = {}, sync[5] = {};
-    rc |= ZinMOX_getPortBits(handle, &ref, &in[0], &in[1], &in[2], 8, &sync[0], &sync[1], &sync[2],
-                             &sync[3], &sync[4], 4);
-    std::ostringstream out;
-    out << "rc " << rc << std::hex;
-    for (uint8_t b : in) out << " " << unsigned{b};
-    return out.str();
+    rc |= ZinMOX_getPortBits(handle, &ref, &in[0], &in[1], &in[2], 8, &s[0], &s[1], &s[2], &s[3],
+                             &s[4], 4);
+    return "rc " + std::to_string(rc) + " " + std::to_string(in[0] | in[1] << 8 | in[2] << 16);
   }
 };
 
@@ -153,16 +155,14 @@ std::vector<std::string> exercise(Host& host) {
   ZinMOX_defineSignal(host.handle, &ref, "sin", ZINMOX_SYNC_INPUT, 0);
   host.call(ZinMOX_writeValues, ref, {{"out", "00"}, {"s.pulsetrain", "0000"}});
   host.call(ZinMOX_readValues, ref);  // clears what earlier runs left in the latches
-  for (const char* value : {"5A", "0F", "F0"}) {
-    out.push_back(host.call(ZinMOX_writeValues, ref, {{"out", value}}));
+  const auto writeRead = [&](const char* name, const char* value) {
+    out.push_back(host.call(ZinMOX_writeValues, ref, {{name, value}}));
     out.push_back(host.call(ZinMOX_readValues, ref));
-  }
+  };
+  for (const char* value : {"5A", "0F", "F0"}) writeRead("out", value);
   out.push_back(host.ports(ref, 0xC3));
   out.push_back(host.ports(ref, 0x3C));
-  for (const char* train : {"FFFF", "0000"}) {
-    out.push_back(host.call(ZinMOX_writeValues, ref, {{"s.pulsetrain", train}}));
-    out.push_back(host.call(ZinMOX_readValues, ref));
-  }
+  for (const char* train : {"FFFF", "0000"}) writeRead("s.pulsetrain", train);
   return out;
 }
 
@@ -173,22 +173,18 @@ class OpenOcdTest : public ::testing::Test {
 };
 
 TEST_F(OpenOcdTest, ExportedFunctionsGiveTheSimulatedTargetsResults) {
-  Host rtl(ZinOpenOcd_openSession("127.0.0.1", static_cast<uint16_t>(rig_.tclPort()), nullptr, 0));
+  Host rtl(ZinOpenOcd_openSession("127.0.0.1", rig_.tclPort(), nullptr, 0));
   ASSERT_NE(rtl.handle, 0U) << ZinOpenOcd_lastError();
   Host sim(ZinJtag_openSession(std::make_shared<ZinSim::Target>()));
   const std::vector<std::string> got = exercise(rtl);
-  const std::vector<std::string> want = exercise(sim);
-  ASSERT_EQ(got.size(), want.size());
-  for (size_t i = 0; i < got.size(); ++i) EXPECT_EQ(got[i], want[i]) << "step " << i;
+  EXPECT_EQ(got, exercise(sim));
   EXPECT_EQ(got[0], "1:0 1:1 1:2 1:3 ");
   EXPECT_EQ(rtl.messages, sim.messages);
 }
 
 TEST_F(OpenOcdTest, BoardsThatDoNotMatchOpenOcdAreRefusedAtConnect) {
-  const struct {
-    const char* board;
-    const char* error;
-  } cases[] = {
+  const std::pair<const char*, const char*> cases[] = {
+      // board, error (none: it connects)
       {R"({"devices":[{"preset":"rtl-model","ir_length":5,"chains":{"1":"0x8"}}]})",
        "has IR length 5, but OpenOCD at 127.0.0.1"},
       {R"({"devices":[{"preset":"rtl-model","idcode":"0x12345678"}]})",
@@ -204,12 +200,10 @@ TEST_F(OpenOcdTest, BoardsThatDoNotMatchOpenOcdAreRefusedAtConnect) {
       {"{", "not valid JSON"},
       {"xilinx-7series", "has no TAP named xc7.tap"},
   };
-  for (const auto& c : cases) {
-    const uint32_t handle =
-        ZinOpenOcd_openSession("127.0.0.1", static_cast<uint16_t>(rig_.tclPort()), c.board, 2000);
-    const std::string error = ZinOpenOcd_lastError();
-    EXPECT_EQ(handle == 0, *c.error != '\0') << c.board;
-    EXPECT_NE(error.find(c.error), std::string::npos) << c.board << " -> " << error;
+  for (const auto& [board, error] : cases) {
+    const uint32_t handle = ZinOpenOcd_openSession("127.0.0.1", rig_.tclPort(), board, 2000);
+    EXPECT_EQ(handle == 0, *error != '\0') << board;
+    EXPECT_TRUE(contains(ZinOpenOcd_lastError(), error)) << board;
     if (handle != 0) ZinJtag_closeSession(handle);
   }
 }
@@ -219,100 +213,70 @@ TEST_F(OpenOcdTest, EmptyChainHasNoCoreAndACorruptedScanFailsItsCheck) {
   std::vector<ZIN_CORE_REF> refs;
   transport->listCores(refs);
   EXPECT_EQ(refs.size(), 4U);  // chains 2 to 4 select BYPASS: no hub, no cores
-  ZIN_CORE_INFO info{};
-  unsigned char status[16] = {};
-  transport->readStatus({0, 2, 0}, info, status, 16, 128);
-  EXPECT_EQ(info.coreType, 0U);
+  EXPECT_EQ(coreType(*transport, {0, 2, 0}), 0U);
   std::vector<unsigned char> data(16);
-  EXPECT_NE(errorOf([&] {
-              transport->commandSequence("00 2 0 03 1 00000048 0", data.data(), 128);
-            }).find("no core at 0:2:0"),
-            std::string::npos);
+  EXPECT_TRUE(contains(
+      errorOf([&] { transport->commandSequence("00 2 0 03 1 00000048 0", data.data(), 128); }),
+      "no core at 0:2:0"));
 
   // A TDO bit flipped on the way: the CRC catches it.
-  class Flipping : public ZinHub::JtagEngine {
-   public:
-    explicit Flipping(std::shared_ptr<ZinHub::JtagEngine> inner) : inner_(std::move(inner)) {}
-    void queueIrScan(uint32_t d, uint32_t l, uint64_t i) override { inner_->queueIrScan(d, l, i); }
-    void queueDrScan(uint32_t d, ZinHub::BitVector tdi) override { inner_->queueDrScan(d, tdi); }
+  struct Flipping : ZinHub::OpenOcdEngine {
+    using OpenOcdEngine::OpenOcdEngine;
     std::vector<ZinHub::BitVector> execute() override {
-      auto out = inner_->execute();
+      auto out = OpenOcdEngine::execute();
       out.back()[40] ^= 1;
       return out;
     }
-    std::shared_ptr<ZinHub::JtagEngine> inner_;
   };
-  auto engine =
-      std::make_shared<ZinHub::OpenOcdEngine>("127.0.0.1", rig_.tclPort(), ZinHub::rtlModelBoard());
-  ZinHub::HubTransport corrupted(std::make_shared<Flipping>(engine));
-  EXPECT_NE(errorOf([&] {
-              corrupted.readStatus({0, 1, 0}, info, status, 16, 128);
-            }).find("integrity failure"),
-            std::string::npos);
-  EXPECT_NE(errorOf([&] {
-              corrupted.commandSequence("00 1 1 03 1 00000048 0", data.data(), 128);
-            }).find("CRC"),
-            std::string::npos);
-}
-
-// Capture lines, so that a process can die while a sequence runs.
-constexpr int kLines = 1000;
-std::string longSequence() {
-  std::string text;
-  for (int i = 0; i < kLines; ++i) text += std::string(i ? "\n" : "") + "00 1 1 03 1 00000048 0";
-  return text;
+  ZinHub::HubTransport corrupted(
+      std::make_shared<Flipping>("127.0.0.1", rig_.tclPort(), ZinHub::rtlModelBoard()));
+  EXPECT_TRUE(contains(errorOf([&] { coreType(corrupted, {0, 1, 0}); }), "integrity failure"));
+  EXPECT_TRUE(contains(
+      errorOf([&] { corrupted.commandSequence("00 1 1 03 1 00000048 0", data.data(), 128); }),
+      "CRC"));
 }
 
 TEST_F(OpenOcdTest, DeathMidCallFailsThatCallAndTheNextCallReconnects) {
   auto transport = ZinHub::openOpenOcd(parse(rig_.target("?timeout=5000")));
+  constexpr int kLines = 1000;  // capture lines, so that a process can die while a sequence runs
+  std::string text = "00 1 1 03 1 00000048 0";
+  for (int i = 1; i < kLines; ++i) text += "\n00 1 1 03 1 00000048 0";
   std::vector<unsigned char> data(kLines * 9);
-  ZIN_CORE_INFO info{};
-  unsigned char status[16] = {};
   for (const bool model : {false, true}) {
     // Sequences back to back until one fails: the kill lands in the middle of one.
     auto calls = std::async(std::launch::async, [&] {
       const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(20);
       std::string error = "(no error)";
-      while (error == "(no error)" && std::chrono::steady_clock::now() < end) {
-        error =
-            errorOf([&] { transport->commandSequence(longSequence(), data.data(), kLines * 72); });
-      }
+      while (error == "(no error)" && std::chrono::steady_clock::now() < end)
+        error = errorOf([&] { transport->commandSequence(text, data.data(), kLines * 72); });
       return error;
     });
     std::this_thread::sleep_for(std::chrono::milliseconds(300));
     rig_.kill(model ? rig_.rtlsim_ : rig_.openocd_);
     const std::string error = calls.get();
-    EXPECT_NE(error.find("OpenOCD at 127.0.0.1:" + std::to_string(rig_.tclPort())),
-              std::string::npos)
-        << error;
+    EXPECT_TRUE(contains(error, "OpenOCD at 127.0.0.1:" + std::to_string(rig_.tclPort())));
     ASSERT_TRUE(rig_.restart()) << rig_.log();
-    info = {};
-    transport->readStatus({0, 1, 1}, info, status, 16, 128);
-    EXPECT_EQ(info.coreType, 9U) << (model ? "after the model died" : "after OpenOCD died");
+    EXPECT_EQ(coreType(*transport, {0, 1, 1}), 9U)  // the next call reconnects
+        << (model ? "after the model died" : "after OpenOCD died");
   }
 }
 
 TEST(OpenOcdFaults, NoOpenOcdOrASilentOneIsAClearErrorWithinTheTimeout) {
   const int port = freeLoopbackPort();
   EXPECT_EQ(ZinOpenOcd_openSession("127.0.0.1", static_cast<uint16_t>(port), nullptr, 500), 0U);
-  EXPECT_NE(std::string(ZinOpenOcd_lastError())
-                .find("OpenOCD at 127.0.0.1:" + std::to_string(port) + ": cannot connect"),
-            std::string::npos)
-      << ZinOpenOcd_lastError();
+  EXPECT_TRUE(contains(ZinOpenOcd_lastError(),
+                       "OpenOCD at 127.0.0.1:" + std::to_string(port) + ": cannot connect"));
 
   // A port that accepts connections and never answers.
   const int fd = socket(AF_INET, SOCK_STREAM, 0);
-  sockaddr_in address{};
-  address.sin_family = AF_INET;
-  address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+  sockaddr_in address{AF_INET, 0, {htonl(INADDR_LOOPBACK)}, {}};
   socklen_t length = sizeof address;
-  ASSERT_EQ(bind(fd, reinterpret_cast<sockaddr*>(&address), sizeof address), 0);
-  ASSERT_EQ(listen(fd, 4), 0);
-  getsockname(fd, reinterpret_cast<sockaddr*>(&address), &length);
+  ASSERT_EQ(bind(fd, reinterpret_cast<sockaddr*>(&address), length), 0);
+  ASSERT_EQ(listen(fd, 4) | getsockname(fd, reinterpret_cast<sockaddr*>(&address), &length), 0);
   const std::string target =
       "openocd://127.0.0.1:" + std::to_string(ntohs(address.sin_port)) + "?timeout=300";
-  EXPECT_NE(errorOf([&] { ZinHub::openOpenOcd(parse(target)); }).find("no answer within 300 ms"),
-            std::string::npos);
+  EXPECT_TRUE(
+      contains(errorOf([&] { ZinHub::openOpenOcd(parse(target)); }), "no answer within 300 ms"));
   close(fd);
 }
 
@@ -345,7 +309,7 @@ TEST(OpenOcdFaults, RtlsimSurvivesJunkAndVanishingClients) {
   close(fd);
   rtlsim->signal(SIGTERM);
   EXPECT_EQ(rtlsim->wait(kStartMs), 0) << rtlsim->output();
-  EXPECT_NE(rtlsim->output().find("stopped (signal)"), std::string::npos);
+  EXPECT_TRUE(contains(rtlsim->output(), "stopped (signal)"));
   EXPECT_EQ(ChildProcess(ZINMOX_RTLSIM_PATH, {"--help"}).wait(kStartMs), 0);
   EXPECT_EQ(ChildProcess(ZINMOX_RTLSIM_PATH, {"--clock-ratio", "3/0"}).wait(kStartMs), 2);
 }
@@ -353,9 +317,8 @@ TEST(OpenOcdFaults, RtlsimSurvivesJunkAndVanishingClients) {
 TEST(OpenOcdFaults, MalformedTargetTexts) {
   for (const char* text : {"openocd://", "openocd://host", "openocd://h:0", "openocd://h:70000",
                            "openocd://h:1?timeout=0", "openocd://h:1?speed=3", "openocd://a;b:1"}) {
-    EXPECT_NE(errorOf([&] { ZinHub::parseOpenOcdTarget(text); }).find("malformed OpenOCD target"),
-              std::string::npos)
-        << text;
+    EXPECT_TRUE(
+        contains(errorOf([&] { ZinHub::parseOpenOcdTarget(text); }), "malformed OpenOCD target"));
   }
   const ZinHub::OpenOcdTarget t = parse("openocd://[::1]:6666?board=ecp5&timeout=250");
   EXPECT_EQ(t.host, "::1");

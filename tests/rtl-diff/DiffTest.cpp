@@ -1,8 +1,7 @@
 // The RTL loopback design against the simulated target: the same random command sequences go to
-// both, and once both have settled after each sequence (the RTL's design clock runs during the
-// scans, so they agree only then), read data and output levels must be identical; status reads
-// are compared once per configuration (docs/rtlsim.md). ZINMOX_RTL_DIFF_SEQUENCES (default 150 per
-// configuration) and ZINMOX_RTL_DIFF_SEED (default 1) choose a longer or another run.
+// both; once both have settled after each sequence, read data and output levels must agree, and
+// status reads once per configuration (docs/rtlsim.md). ZINMOX_RTL_DIFF_SEQUENCES (default 150)
+// and ZINMOX_RTL_DIFF_SEED (default 1) choose a longer or another run.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -31,37 +30,33 @@ uint64_t envNumber(const char* name, uint64_t fallback) {
   return text != nullptr && *text != '\0' ? std::strtoull(text, nullptr, 10) : fallback;
 }
 
-// The information fields and the status word from bit 40 (below it the record carries the
-// information) agree.
+// The information fields agree, and so does the status word from record bit 40 on.
 void expectSameStatus(ZinRT::Zin_Transport& sim, ZinRT::Zin_Transport& rtl) {
   ZIN_CORE_INFO info[2] = {};
-  std::vector<unsigned char> status[2] = {std::vector<unsigned char>(16),
-                                          std::vector<unsigned char>(16)};
-  sim.readStatus(kRef, info[0], status[0].data(), 16, 128);
-  rtl.readStatus(kRef, info[1], status[1].data(), 16, 128);
+  unsigned char status[2][16] = {};
+  sim.readStatus(kRef, info[0], status[0], 16, 128);
+  rtl.readStatus(kRef, info[1], status[1], 16, 128);
   EXPECT_EQ(std::memcmp(&info[0], &info[1], sizeof info[0]), 0);
-  EXPECT_EQ(std::vector<unsigned char>(status[1].begin() + 5, status[1].end()),
-            std::vector<unsigned char>(status[0].begin() + 5, status[0].end()));
+  EXPECT_EQ(std::memcmp(status[0] + 5, status[1] + 5, 11), 0);
 }
 
 struct Widths {
   unsigned asyncOut, syncOut, asyncIn, syncIn;
 };
 
-template <class Value>
-std::string levelText(Value port, unsigned width) {
+std::string levelText(uint64_t port, unsigned width) {
   std::string text(width, '0');
-  for (unsigned i = 0; i < width; ++i) text[i] = ((uint64_t{port} >> i) & 1U) != 0 ? '1' : '0';
+  for (unsigned i = 0; i < width; ++i) text[i] = ((port >> i) & 1U) != 0 ? '1' : '0';
   return text;
 }
 
-std::shared_ptr<ZinSim::Target> simTwin(Widths widths) {
+std::shared_ptr<ZinSim::Target> simTwin(Widths w) {
   ZinSim::CoreDescription core;
   core.ref = kRef;
-  core.asyncOutputs = widths.asyncOut;
-  core.syncOutputs = widths.syncOut;
-  core.asyncInputs = widths.asyncIn;
-  core.syncInputs = widths.syncIn;
+  core.asyncOutputs = w.asyncOut;
+  core.syncOutputs = w.syncOut;
+  core.asyncInputs = w.asyncIn;
+  core.syncInputs = w.syncIn;
   ZinSim::TargetDescription description;
   description.cores.push_back(core);
   return std::make_shared<ZinSim::Target>(description);
@@ -78,42 +73,31 @@ struct Sequence {
   uint32_t readBits = 0;
 };
 
-// Random command sequences for one core, in the library's line format: stage + commit, stage,
+// A random command sequence for one core, in the library's line format: stage + commit, stage,
 // commit, capture + clear, capture, or clear.
-class SequenceSource {
- public:
-  SequenceSource(Widths widths, uint64_t seed) : widths_(widths), random_(seed) {}
-
-  Sequence next() {
-    const int pick = std::uniform_int_distribution<int>(0, 9)(random_);
-    const uint32_t capture = 4 * widths_.asyncIn + 6 * widths_.syncIn + 16;
-    const std::string commit = "00 1 0 02 0 00000004 0", clear = "00 1 0 04 1 00000004 0";
-    const std::string read = "00 1 0 03 1 " + hex8(capture) + " 0";
-    const uint32_t readBits = (capture + 7) / 8 * 8;
-    if (pick < 4) return {stageLine() + "\n" + commit};
-    if (pick == 4) return {stageLine()};
-    if (pick == 5) return {commit};
-    if (pick < 8) return {read + "\n" + clear, readBits + 8};
-    return pick == 8 ? Sequence{read, readBits} : Sequence{clear, 8};
-  }
-
- private:
-  std::string stageLine() {
-    const size_t bits = 2 * widths_.asyncOut + 17 * widths_.syncOut;  // the number's low L-1 bits
+Sequence randomSequence(const Widths& widths, std::mt19937_64& rng) {
+  const int pick = std::uniform_int_distribution<int>(0, 9)(rng);
+  const uint32_t capture = 4 * widths.asyncIn + 6 * widths.syncIn + 16;
+  const std::string commit = "00 1 0 02 0 00000004 0", clear = "00 1 0 04 1 00000004 0";
+  const std::string read = "00 1 0 03 1 " + hex8(capture) + " 0";
+  const uint32_t readBits = (capture + 7) / 8 * 8;
+  const auto stageLine = [&] {
+    const size_t bits = 2 * widths.asyncOut + 17 * widths.syncOut;  // the number's low L-1 bits
     std::string hex((bits + 3) / 4, '0');
     for (size_t digit = 0; digit < hex.size(); ++digit) {
       const size_t valid = std::min<size_t>(4, bits - 4 * digit);
-      hex[hex.size() - 1 - digit] = "0123456789ABCDEF"[random_() & ((1U << valid) - 1)];
+      hex[hex.size() - 1 - digit] = "0123456789ABCDEF"[rng() & ((1U << valid) - 1)];
     }
     return "00 1 0 01 0 " + hex8(bits + 1) + " " + hex;
-  }
+  };
+  if (pick < 4) return {stageLine() + "\n" + commit};
+  if (pick == 4) return {stageLine()};
+  if (pick == 5) return {commit};
+  if (pick < 8) return {read + "\n" + clear, readBits + 8};
+  return pick == 8 ? Sequence{read, readBits} : Sequence{clear, 8};
+}
 
-  Widths widths_;
-  std::mt19937_64 random_;
-};
-
-// One configuration: the verilated loopback design behind the hub transport over the pin-level
-// engine, against its simulated twin.
+// The verilated loopback design behind the hub transport, against its simulated twin.
 template <class Model>
 void runPair(Widths widths, ZinRtl::ClockRatio ratio) {
   VerilatedContext context;
@@ -128,20 +112,20 @@ void runPair(Widths widths, ZinRtl::ClockRatio ratio) {
   ASSERT_EQ(cores.size(), 1U);
 
   const uint64_t count = envNumber("ZINMOX_RTL_DIFF_SEQUENCES", 150);
-  SequenceSource source(widths, envNumber("ZINMOX_RTL_DIFF_SEED", 1));
+  std::mt19937_64 rng(envNumber("ZINMOX_RTL_DIFF_SEED", 1));
   for (uint64_t n = 0; n < count; ++n) {
-    const Sequence sequence = source.next();
+    const Sequence sequence = randomSequence(widths, rng);
     const uint32_t bits = sequence.readBits;
-    std::vector<unsigned char> simData(bits / 8 + 1, 0), rtlData(bits / 8 + 1, 0);
+    std::vector<unsigned char> simData(bits / 8 + 1), rtlData(bits / 8 + 1);
     sim->commandSequence(sequence.text, simData.data(), bits);
     rtl.commandSequence(sequence.text, rtlData.data(), bits);
     sim->advance(kSettleCycles);
     pins.runDesignCycles(kSettleCycles);
     ASSERT_EQ(rtlData, simData) << "read data after sequence " << n << ":\n" << sequence.text;
-    ASSERT_EQ(levelText(model.async_out_o, widths.asyncOut), sim->asyncOutputLevels(kRef))
-        << "sequence " << n;
-    ASSERT_EQ(levelText(model.sync_out_o, widths.syncOut), sim->syncOutputLevels(kRef))
-        << "sequence " << n;
+    ASSERT_EQ(levelText(model.async_out_o, widths.asyncOut) + " " +
+                  levelText(model.sync_out_o, widths.syncOut),
+              sim->asyncOutputLevels(kRef) + " " + sim->syncOutputLevels(kRef))
+        << "levels after sequence " << n;
   }
   model.final();
 }

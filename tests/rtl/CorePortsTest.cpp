@@ -12,9 +12,7 @@ class CorePorts : public ::testing::Test {
  protected:
   CorePorts() {
     m_.rst_ni = 0;
-    edge();
-    edge();
-    edge();
+    for (int i = 0; i < 3; ++i) edge();
     m_.rst_ni = 1;
     edge();
   }
@@ -25,34 +23,31 @@ class CorePorts : public ::testing::Test {
     m_.clk_i = 0;
     m_.eval();
   }
-  uint32_t capture() {
-    m_.capture_i = 1;
+  // One design cycle with a strobe high.
+  void pulse(uint8_t& strobe) {
+    strobe = 1;
     edge();
-    m_.capture_i = 0;
+    strobe = 0;
+  }
+  uint32_t capture() {
+    pulse(m_.capture_i);
     return m_.cap_o;
   }
   Vzinmox_core_ports m_;
 };
 
-TEST_F(CorePorts, SetWinsOverClearAndClearClears) {
+TEST_F(CorePorts, SetWinsOverClearAndTheAsyncInputIsSynchronised) {
   m_.sync_in_i = 1;  // the rise is sampled at the same edge as the clear
-  m_.clear_i = 1;
-  edge();
-  m_.clear_i = 0;
+  pulse(m_.clear_i);
   EXPECT_EQ(capture() & 0x3Eu, 0x34u);  // value, up, sync up
-  m_.clear_i = 1;
-  edge();
-  m_.clear_i = 0;
+  pulse(m_.clear_i);
   EXPECT_EQ(capture() & 0x3Eu, 0x20u);  // value only: the clear removed the latches
   m_.sync_in_i = 0;
   edge();
   EXPECT_EQ(capture() & 0x3Eu, 0x0Au);  // down and sync down
-}
 
-TEST_F(CorePorts, AsyncInputPassesTheSynchroniser) {
-  m_.async_in_i = 1;  // a pulse of one cycle
-  edge();
-  m_.async_in_i = 0;
+  // The async input passes the synchroniser.
+  pulse(m_.async_in_i);                   // a pulse of one cycle
   EXPECT_EQ(capture() & 0x380u, 0x000u);  // still in the synchroniser
   edge();
   EXPECT_EQ(capture() & 0x380u, 0x300u);  // value 1 and up

@@ -1,7 +1,6 @@
-// Pin-level tests of the RTL: PinBench drives a Verilator model's JTAG tops, scheduling the
-// design clock and TCK on one time line (any ratio, optional jitter); HubClient is the host side
-// of the hub protocol (docs/hub-protocol.md) over it, built on ZinHub's codec and CRC: status
-// records, stage images, request replies and capture read-outs.
+// Pin-level tests of the RTL: PinBench drives a Verilator model's JTAG tops with the design clock
+// and TCK on one time line (any ratio, optional jitter); HubClient is the host side of the hub
+// protocol (docs/hub-protocol.md) over it, built on ZinHub's codec and CRC.
 #pragma once
 
 #include <algorithm>
@@ -11,7 +10,6 @@
 #include <ostream>
 #include <random>
 #include <stdexcept>
-#include <string>
 #include <vector>
 
 #include "ZinHub/Crc16.h"
@@ -21,12 +19,11 @@
 namespace RtlTest {
 
 using Bits = ZinHub::BitVector;  // one bit per element, bit 0 shifted first
+using ZinHub::appendNumber;
 
 // Periods in arbitrary time units; jitter is a fraction of each half period (0 to 0.9).
 struct ClockPlan {
-  double tckPeriod = 10;
-  double clkPeriod = 10;
-  double jitter = 0;
+  double tckPeriod = 10, clkPeriod = 10, jitter = 0;
   uint32_t seed = 1;
 };
 inline void PrintTo(const ClockPlan& p, std::ostream* os) {
@@ -37,42 +34,33 @@ template <class Model>
 class PinBench : public ZinHub::JtagPins {
  public:
   explicit PinBench(const ClockPlan& plan) : plan_(plan), rng_(plan.seed) {
-    m_.clk_i = 0;
-    m_.tck_i = 0;
+    m_.clk_i = m_.tck_i = m_.tdi_i = m_.rst_ni = m_.trst_ni = 0;
     m_.tms_i = 1;
-    m_.tdi_i = 0;
-    m_.rst_ni = 0;
-    m_.trst_ni = 0;
     m_.eval();
     nextClk_ = half(plan_.clkPeriod);
     runTo(4 * plan_.clkPeriod);
-    m_.rst_ni = 1;
-    m_.trst_ni = 1;
+    m_.rst_ni = m_.trst_ni = 1;
     m_.eval();
   }
-  PinBench(const PinBench&) = delete;
-  PinBench& operator=(const PinBench&) = delete;
   ~PinBench() override { m_.final(); }
 
-  Model& model() { return m_; }
   // Called after every rising edge of the design clock.
   void onClockEdge(std::function<void(Model&)> observer) { observer_ = std::move(observer); }
 
   // Lets design-clock edges happen up to time t.
   void runTo(double t) {
-    while (nextClk_ <= t) {
+    for (; nextClk_ <= t; nextClk_ += half(plan_.clkPeriod)) {
       now_ = nextClk_;
       m_.clk_i = !m_.clk_i;
       m_.eval();
       if (m_.clk_i && observer_) observer_(m_);
-      nextClk_ += half(plan_.clkPeriod);
     }
     now_ = t;
   }
   void runClocks(uint64_t n) { runTo(now_ + static_cast<double>(n) * plan_.clkPeriod); }
 
   // One TCK cycle; returns TDO as sampled just before the rising edge.
-  bool tck(bool tms, bool tdi) {
+  bool clock(bool tms, bool tdi) override {
     m_.tms_i = tms;
     m_.tdi_i = tdi;
     m_.eval();
@@ -85,11 +73,12 @@ class PinBench : public ZinHub::JtagPins {
     m_.eval();
     return tdo;
   }
-  bool clock(bool tms, bool tdi) override { return tck(tms, tdi); }
-
+  void idle(int cycles) {
+    for (int i = 0; i < cycles; ++i) clock(false, false);
+  }
   void resetTap() {
-    for (int i = 0; i < 5; ++i) tck(true, false);
-    tck(false, false);
+    for (int i = 0; i < 5; ++i) clock(true, false);
+    idle(1);
   }
   void pulseTrst() {
     m_.trst_ni = 0;
@@ -97,17 +86,13 @@ class PinBench : public ZinHub::JtagPins {
     runTo(now_ + plan_.tckPeriod);
     m_.trst_ni = 1;
     m_.eval();
-    tck(false, false);  // Test-Logic-Reset -> Run-Test/Idle
-  }
-  void idle(int cycles) {
-    for (int i = 0; i < cycles; ++i) tck(false, false);
+    idle(1);  // Test-Logic-Reset -> Run-Test/Idle
   }
 
-  // IR and whole DR scans go from Run-Test/Idle back to it through ZinHub's TAP walker. With
-  // stopAfter set, a DR scan stops in Shift-DR after that many bits (for tests that cut a scan
-  // short, then reset the TAP).
-  void ir(uint32_t value, uint32_t length = 4) {
-    engine_.queueIrScan(0, length, value);
+  // IR and DR scans from Run-Test/Idle back to it; a DR scan with stopAfter below its length
+  // stays in Shift-DR after that many bits (tests that cut a scan short, then reset the TAP).
+  void ir(uint32_t value) {
+    engine_.queueIrScan(0, 4, value);
     engine_.execute();
   }
   Bits dr(const Bits& in, size_t stopAfter = SIZE_MAX) {
@@ -115,40 +100,33 @@ class PinBench : public ZinHub::JtagPins {
       engine_.queueDrScan(0, in);
       return engine_.execute().front();
     }
-    for (bool tms : {true, false, false}) tck(tms, false);  // Select-DR, Capture-DR, Shift-DR
+    for (bool tms : {true, false, false}) clock(tms, false);  // to Shift-DR
     Bits out;
-    for (size_t i = 0; i < stopAfter; ++i) out.push_back(tck(false, in[i]));
+    for (size_t i = 0; i < stopAfter; ++i) out.push_back(clock(false, in[i]));
     return out;
   }
 
  private:
   double half(double period) {
-    std::uniform_real_distribution<double> d(-plan_.jitter, plan_.jitter);
-    return period / 2 * (1 + d(rng_));
+    return period / 2 *
+           (1 + std::uniform_real_distribution<double>(-plan_.jitter, plan_.jitter)(rng_));
   }
 
   Model m_;
   ZinHub::PinJtagEngine engine_{*this};
   ClockPlan plan_;
   std::mt19937 rng_;
-  double now_ = 0;
-  double nextClk_ = 0;
+  double now_ = 0, nextClk_ = 0;
   std::function<void(Model&)> observer_;
 };
 
-enum Op : uint32_t { kHubInfo = 0, kStage = 1, kCommit = 2, kCapture = 3, kClear = 4, kStatus = 5 };
+using Op = ZinHub::HubOp;
+using enum ZinHub::HubOp;
 
-using ZinHub::appendNumber;
-using ZinHub::crc16;
-using CaptureWord = ZinHub::CaptureWord;
 inline uint64_t number(const Bits& bits, size_t first, size_t length) {
   return ZinHub::readNumber(bits, first, static_cast<unsigned>(length));
 }
-inline bool crcOk(const Bits& bits, size_t first, size_t length) {
-  return crc16(bits, first, length + 16) == 0;
-}
 
-// An output image for a stage scan.
 struct Image {
   std::vector<bool> asyncValue, asyncMark, syncMark;
   std::vector<uint16_t> trains;  // bit t = step t
@@ -181,37 +159,35 @@ inline size_t waitBits(const ClockPlan& plan) {
 template <class Bench>
 class HubClient {
  public:
-  HubClient(Bench& bench, uint32_t waitBits = 64) : bench_(bench), wait_(waitBits) {}
+  HubClient(Bench& bench, size_t waitBits) : bench_(bench), wait_(waitBits) {}
 
-  // One DR scan of the given TDI bits; returns everything TDO gave.
   Bits raw(const Bits& in, size_t stopAfter = SIZE_MAX) {
     Bits out = bench_.dr(in, stopAfter);
     last_ = ZinHub::parseCaptureWord(out);
     return out;
   }
-  Bits scan(uint32_t op, uint32_t core, const Bits& payload, size_t stopAfter = SIZE_MAX) {
+  Bits scan(Op op, uint32_t core, const Bits& payload, size_t stopAfter = SIZE_MAX) {
     Bits in;
-    ZinHub::appendHeader(in, static_cast<ZinHub::HubOp>(op), core);
+    ZinHub::appendHeader(in, op, core);
     in.insert(in.end(), payload.begin(), payload.end());
     return raw(in, stopAfter);
   }
-  const CaptureWord& lastCaptureWord() const { return last_; }
+  const ZinHub::CaptureWord& lastCaptureWord() const { return last_; }
 
-  // A record read (hub info or core status): checks the CRC and returns the record's bits.
-  Bits record(uint32_t op, uint32_t core, size_t length) {
+  // A record read (hub info or core status) with its CRC checked.
+  Bits record(Op op, uint32_t core, size_t length) {
     const Bits out = scan(op, core, Bits(length + 16, 0));
-    if (!crcOk(out, 16, length)) throw std::runtime_error("record CRC mismatch");
+    if (ZinHub::crc16(out, 16, length + 16) != 0) throw std::runtime_error("record CRC mismatch");
     return Bits(out.begin() + 16, out.begin() + 16 + static_cast<long>(length));
   }
 
-  // A stage scan's TDI: header, the image's number and its CRC.
   static Bits stageScan(uint32_t core, const Image& image) {
     return ZinHub::stageRequest(core, stageNumber(image));
   }
   void stage(uint32_t core, const Image& image) { raw(stageScan(core, image)); }
 
-  // A request op: returns the reply bits after the start bit, or nothing without a start bit.
-  std::optional<Bits> request(uint32_t op, uint32_t core, size_t replyLength) {
+  // A request op: the reply bits after the start bit, or nothing without a start bit.
+  std::optional<Bits> request(Op op, uint32_t core, size_t replyLength) {
     const Bits out = scan(op, core, Bits(wait_ + 1 + replyLength, 0));
     const auto at = ZinHub::findReply(out, static_cast<unsigned>(wait_));
     if (!at) return std::nullopt;
@@ -219,32 +195,30 @@ class HubClient {
                 out.begin() + static_cast<long>(*at + replyLength));
   }
   // Commit or clear: the 8-bit result (bit 0 done, bit 1 refused), -1 without an answer.
-  int result(uint32_t op, uint32_t core) {
+  int result(Op op, uint32_t core) {
     const auto reply = request(op, core, 8);
     return reply ? static_cast<int>(number(*reply, 0, 8)) : -1;
   }
 
-  // Capture of a core with a async and s sync inputs; checks the CRC.
+  // Capture of a core with a async and s sync inputs, CRC checked.
   std::vector<InputReading> capture(uint32_t core, size_t a, size_t s) {
     const size_t n = 4 * a + 6 * s;
     const auto reply = request(kCapture, core, n + 16);
-    if (!reply) throw std::runtime_error("capture: no start bit");
-    if (!crcOk(*reply, 0, n)) throw std::runtime_error("capture: CRC mismatch");
+    if (!reply || ZinHub::crc16(*reply, 0, n + 16) != 0)
+      throw std::runtime_error("capture: no start bit or bad CRC");
     const auto b = [&](size_t k) { return (*reply)[n - 1 - k] != 0; };
     std::vector<InputReading> r;
     for (size_t i = 0; i < a; ++i)
       r.push_back({b(4 * i), b(4 * i + 1), b(4 * i + 2), false, false});
-    for (size_t i = 0; i < s; ++i) {
-      const size_t o = 4 * a + 6 * i;
+    for (size_t o = 4 * a; o < n; o += 6)
       r.push_back({b(o), b(o + 1), b(o + 2), b(o + 3), b(o + 4)});
-    }
     return r;
   }
 
  private:
   Bench& bench_;
   size_t wait_;
-  CaptureWord last_{};
+  ZinHub::CaptureWord last_{};
 };
 
 }  // namespace RtlTest
