@@ -1,6 +1,8 @@
 // Tables and JSON of readings, scans and core information.
 #include "ZinHost/Report.h"
 
+#include "ZinHost/ReadingJson.h"
+
 #include <nlohmann/json.hpp>
 
 #include "ZinHost/CoreRef.h"
@@ -19,18 +21,7 @@ std::string versionText(uint32_t major, uint32_t minor, uint32_t third) {
 
 json readingsJson(const ZIN_CORE_REF& ref, const std::vector<InputReading>& inputs) {
   json list = json::array();
-  for (const InputReading& input : inputs) {
-    json entry{{"name", input.name},
-               {"width", input.width},
-               {"value", input.value},
-               {"activity_up", input.activityUp},
-               {"activity_down", input.activityDown}};
-    if (input.sync) {
-      entry["sync_activity_up"] = input.syncActivityUp;
-      entry["sync_activity_down"] = input.syncActivityDown;
-    }
-    list.push_back(entry);
-  }
+  for (const InputReading& input : inputs) list.push_back(readingJson(input));
   return json{{"core", formatCoreRef(ref)}, {"signals", list}};
 }
 
@@ -117,6 +108,19 @@ void printInfo(std::ostream& out, const ZIN_CORE_REF& ref, const ZINMOX_CORE_INF
     table.addRow({field.key, std::to_string(info.*field.member)});
   }
   table.print(out);
+}
+
+json readingJson(const InputReading& input) {
+  json entry{{"name", input.name},
+             {"width", input.width},
+             {"value", input.value},
+             {"activity_up", input.activityUp},
+             {"activity_down", input.activityDown}};
+  if (input.sync) {
+    entry["sync_activity_up"] = input.syncActivityUp;
+    entry["sync_activity_down"] = input.syncActivityDown;
+  }
+  return entry;
 }
 
 }  // namespace ZinHost

@@ -6,6 +6,7 @@
 #include <sstream>
 
 #include "Vcd.h"
+#include "ZinHost/ReadingJson.h"
 
 namespace zinmox::dashboard {
 
@@ -65,19 +66,6 @@ std::string bitsText(const Json& object) {
   }
   if (joined.empty()) throw ApiError(400, "'bits' is empty");
   return joined;
-}
-
-Json readingJson(const Reading& r) {
-  Json entry{{"name", r.name},
-             {"width", r.width},
-             {"value", r.value},
-             {"activity_up", r.activityUp},
-             {"activity_down", r.activityDown}};
-  if (r.sync) {
-    entry["sync_activity_up"] = r.syncActivityUp;
-    entry["sync_activity_down"] = r.syncActivityDown;
-  }
-  return entry;
 }
 
 Json settingsJson(const LiveSettings& settings) {
@@ -181,7 +169,7 @@ Json stateJson(const HubState& state, uint64_t hostVersion) {
   Json samples = Json::array();
   for (const Sample& sample : state.samples) {
     Json inputs = Json::array();
-    for (const Reading& reading : sample.inputs) inputs.push_back(readingJson(reading));
+    for (const Reading& reading : sample.inputs) inputs.push_back(ZinHost::readingJson(reading));
     samples.push_back({{"seq", sample.seq}, {"t_us", sample.timeUs}, {"inputs", inputs}});
   }
   return Json{{"live", settingsJson(state.settings)},

@@ -16,8 +16,8 @@
 #include "ZinHost/TextError.h"
 #include "ZinHost/ValueText.h"
 #include "ZinMOX/ZinMOX.h"
-#include "internal/ZinMOX_CoreInfoFields.h"
 #include "ZinRT/Zin_CoreComm.h"
+#include "internal/ZinMOX_CoreInfoFields.h"
 
 namespace zinmox::dashboard {
 
@@ -271,12 +271,7 @@ void HostLink::write(const std::string& refText,
 std::vector<Reading> HostLink::read(const std::string& refText) {
   return guarded([&] {
     const std::string ref = moxCoreLocked(refText);
-    std::vector<Reading> readings;
-    for (const InputValue& input : readInputValues(session_, parseCoreRef(ref), {})) {
-      readings.push_back(Reading{input.name, input.width, input.sync, input.value, input.activityUp,
-                                 input.activityDown, input.syncActivityUp, input.syncActivityDown});
-    }
-    return readings;
+    return readInputValues(session_, parseCoreRef(ref), {});
   });
 }
 

@@ -3,19 +3,13 @@
 #ifndef ZINMOX_DASHBOARD_READING_H
 #define ZINMOX_DASHBOARD_READING_H
 
-#include <cstdint>
-#include <string>
+#include "ZinHost/Report.h"
 
 namespace zinmox::dashboard {
 
 /// The library's hex texts of one input: its value and activity (sync activity: synchronous
 /// inputs only).
-struct Reading {
-  std::string name;
-  uint32_t width = 0;
-  bool sync = false;
-  std::string value, activityUp, activityDown, syncActivityUp, syncActivityDown;
-};
+using Reading = ZinHost::InputReading;
 
 }  // namespace zinmox::dashboard
 
