@@ -15,8 +15,11 @@ ZinJtagTargetLock::ZinJtagTargetLock(uint32_t handle, uint32_t timeoutMs)
     ++s.lockCount;
     return;
   }
-  const bool free = s.lockReleased.wait_for(guard, std::chrono::milliseconds(timeoutMs),
-                                            [&s] { return s.depth == 0 || s.closed; });
+  // A free lock is taken at once: the wait, and the clock read that sets its deadline, are only
+  // for a lock that another thread holds.
+  const auto ready = [&s] { return s.depth == 0 || s.closed; };
+  const bool free =
+      ready() || s.lockReleased.wait_for(guard, std::chrono::milliseconds(timeoutMs), ready);
   if (s.closed) {
     throw std::runtime_error("ZinJtag: session " + std::to_string(handle) +
                              " was closed while the call waited for its target lock");
