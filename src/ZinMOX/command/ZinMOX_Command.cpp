@@ -119,28 +119,14 @@ std::string& ZinMOX_Command::buildCommandText(const ZIN_CORE_REF& coreRef, uint3
   if (readBitCount != nullptr) *readBitCount = 0;
   text.clear();
   std::string scratch;
-  const uint32_t aOut = moxCoreInfo.async_output_count;
-  const uint32_t sOut = moxCoreInfo.sync_output_count;
   switch (code) {
     case 1: {
-      // D: the asynchronous values, the step strings in bit order, then both update masks. Its
-      // hexadecimal text is written straight after the line's other fields.
-      const size_t dataBits =
-          2 * static_cast<size_t>(aOut) + SYNC_OUT_BITS * static_cast<size_t>(sOut);
+      const size_t dataBits = writeDataBits();
       // Room for this line and the short line that follows it in a write, so that neither the
       // line nor the sequence is copied on growing.
       text.reserve(dataBits / 4 + 2 * SHORT_LINE_LENGTH);
       appendLine(text, coreRef, 1, '0', static_cast<uint32_t>(dataBits + 1), "", scratch);
-      const size_t dataStart = text.size();
-      if (dataBits == 0) {
-        text += '0';
-      } else if (!appendDataHex(text, dataBits)) {
-        // Every writer stages only '0'/'1' and whole step strings: a text that fails its own
-        // check is a fault of the library, and no wrong data may reach the wire.
-        text.resize(dataStart);
-        throw std::logic_error("ZinMOX_Command::buildCommandText(): the port image does not give " +
-                               std::to_string(dataBits) + " bits of output data");
-      }
+      appendWriteData(text);
       break;
     }
     case 2:
@@ -162,6 +148,39 @@ std::string& ZinMOX_Command::buildCommandText(const ZIN_CORE_REF& coreRef, uint3
   return text;
 }
 
+size_t ZinMOX_Command::writeDataBits() const {
+  // D: the asynchronous values, the step strings in bit order, then both update masks.
+  return 2 * static_cast<size_t>(moxCoreInfo.async_output_count) +
+         SYNC_OUT_BITS * static_cast<size_t>(moxCoreInfo.sync_output_count);
+}
+
+void ZinMOX_Command::appendWriteData(std::string& text) const {
+  const size_t dataBits = writeDataBits();
+  const size_t dataStart = text.size();
+  if (dataBits == 0) {
+    text += '0';
+  } else if (!appendDataHex(text, dataBits)) {
+    // Every writer stages only '0'/'1' and whole step strings: a text that fails its own check
+    // is a fault of the library, and no wrong data may reach the wire.
+    text.resize(dataStart);
+    throw std::logic_error("ZinMOX_Command::buildCommandText(): the port image does not give " +
+                           std::to_string(dataBits) + " bits of output data");
+  }
+}
+
+template <class Render>
+const ZinMOX_Command::RenderedLines& ZinMOX_Command::renderedFor(RenderedLines& lines,
+                                                                 const ZIN_CORE_REF& coreRef,
+                                                                 Render&& render) {
+  if (!lines.valid || !sameRef(lines.ref, coreRef)) {
+    lines.valid = false;
+    render(lines.text);
+    lines.ref = coreRef;
+    lines.valid = true;
+  }
+  return lines;
+}
+
 bool ZinMOX_Command::appendDataHex(std::string& text, size_t dataBits) const {
   mox::HexTextWriter writer(text, dataBits);
   return writer.add(asyncOutValueBits) && writer.add(syncOutSteps) &&
@@ -170,18 +189,24 @@ bool ZinMOX_Command::appendDataHex(std::string& text, size_t dataBits) const {
 
 void ZinMOX_Command::writeOutputs(uint32_t handle, const ZIN_CORE_REF& coreRef) {
   if (moxCoreInfo.async_output_count == 0 && moxCoreInfo.sync_output_count == 0) return;
-  // The sequence is rendered into storage kept from the last write; the code-02 line depends
-  // only on the reference and is rendered again only when the reference changes.
-  if (!commitLine_.valid || !sameRef(commitLine_.ref, coreRef)) {
-    commitLine_.valid = false;
-    buildCommandText(coreRef, 2, commitLine_.text, nullptr);
-    commitLine_.ref = coreRef;
-    commitLine_.valid = true;
-  }
+  // The sequence is rendered into storage kept from the last write. The write line's fields
+  // before its data and the code-02 line depend only on the reference and the port widths: they
+  // are rendered again only when the reference changes.
+  const std::string& head =
+      renderedFor(writeHead_, coreRef, [&](std::string& line) {
+        line.clear();
+        std::string scratch;
+        appendLine(line, coreRef, 1, '0', static_cast<uint32_t>(writeDataBits() + 1), "", scratch);
+      }).text;
+  const std::string& commit = renderedFor(commitLine_, coreRef, [&](std::string& line) {
+                                buildCommandText(coreRef, 2, line, nullptr);
+                              }).text;
   std::string& text = writeText_;
-  buildCommandText(coreRef, 1, text, nullptr);
+  text.reserve(head.size() + writeDataBits() / 4 + 2 + commit.size());
+  text.assign(head);
+  appendWriteData(text);
   text += '\n';
-  text += commitLine_.text;
+  text += commit;
   // The sequence and its flush go to the transport together: a remote target carries both in
   // one round trip.
   ZinJtag_session_withTransport(handle, [t = &text](ZinRT::Zin_Transport& transport) {
@@ -195,12 +220,9 @@ void ZinMOX_Command::readInputs(uint32_t handle, const ZIN_CORE_REF& coreRef) {
   if (aIn == 0 && sIn == 0) return;
   // The read sequence depends only on the reference and the port widths: rendered again only
   // when the reference changes.
-  if (!readLines_.valid || !sameRef(readLines_.ref, coreRef)) {
-    readLines_.valid = false;
-    buildCommandText(coreRef, 3, readLines_.text, &readLines_.readBits);
-    readLines_.ref = coreRef;
-    readLines_.valid = true;
-  }
+  renderedFor(readLines_, coreRef, [&](std::string& lines) {
+    buildCommandText(coreRef, 3, lines, &readLines_.readBits);
+  });
   const uint32_t readBits = readLines_.readBits;
   readData_.resize(mox::byteCount(readBits) + READ_DATA_SLACK);
   Zin_CoreComm::commandSequence(handle, readLines_.text, readData_.data(), readBits, nullptr);

@@ -145,6 +145,11 @@ class ZinMOX_Command {
   // them), without building D; false when the image holds anything but '0'/'1' (a step string
   // of the wrong length is held as characters that are not).
   bool appendDataHex(std::string& text, size_t dataBits) const;
+  // The number of output data bits of the write line.
+  size_t writeDataBits() const;
+  // Appends the write line's data: the text of D, or "0" when the core has no outputs. Fails,
+  // with the text as it was, when the image does not give D.
+  void appendWriteData(std::string& text) const;
 
   std::string asyncOutValueBits;
   // A character that is neither '0' nor '1': a step string of another length becomes STEP_COUNT
@@ -177,6 +182,11 @@ class ZinMOX_Command {
     uint32_t readBits = 0;
     bool valid = false;
   };
+  // Renders `lines` with `render(text)` unless they were last rendered for `coreRef`.
+  template <class Render>
+  static const RenderedLines& renderedFor(RenderedLines& lines, const ZIN_CORE_REF& coreRef,
+                                          Render&& render);
+  RenderedLines writeHead_;  // the write line up to its data
   RenderedLines commitLine_;
   RenderedLines readLines_;
   std::string writeText_;
