@@ -76,6 +76,11 @@ class ZINUTIL_API Zin_ByteBuffer {
   /// of the last byte. Throws std::invalid_argument on a character that is not a hexadecimal digit
   /// and std::out_of_range when the range is not inside the buffer (or `first` > `last`).
   Zin_ByteBuffer* hex2Bin(uint32_t first, uint32_t last) const;
+  /// The conversion of hex2Bin for the `count` digits at `digits`, into `out`, which is replaced
+  /// and keeps its storage for the next call; afterwards `out.getSize()` is ceil(count/2).
+  /// `digits` must not lie inside `out`. Throws std::invalid_argument on a character that is not
+  /// a hexadecimal digit.
+  static void hexDigits2Bin(const char* digits, uint32_t count, Zin_ByteBuffer& out);
 
  private:
   void ensureCapacity(uint32_t size);

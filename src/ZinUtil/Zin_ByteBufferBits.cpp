@@ -82,27 +82,30 @@ Zin_ByteBuffer* Zin_ByteBuffer::hex2Bin(uint32_t first, uint32_t last) const {
                             std::to_string(last) + " are not inside a text of " +
                             std::to_string(size_) + " characters");
   }
-  const uint32_t digitCount = last - first + 1;
-  const uint32_t byteCount = digitCount / 2 + digitCount % 2;
-  auto bin = std::make_unique<Zin_ByteBuffer>(byteCount, 0, 0);
-  const char* text = ptr();
-  unsigned char* bytes = bin->uPtr();
+  auto bin = std::make_unique<Zin_ByteBuffer>();
+  hexDigits2Bin(ptr() + first, last - first + 1, *bin);
+  return bin.release();
+}
+
+void Zin_ByteBuffer::hexDigits2Bin(const char* digits, uint32_t count, Zin_ByteBuffer& out) {
+  out.resize(0);
+  out.resize(count / 2 + count % 2);  // zero-filled: the digits below are or-ed in
+  unsigned char* bytes = out.uPtr();
+  const char* last = digits + count - 1;
   // The last digit is the least significant: digit pairs fill the bytes from byte 0 upwards,
   // sixteen digits (eight bytes) at a time while they are all digits. The rest, and a block that
   // holds a bad digit, go one digit at a time, so a bad digit is reported as the conversion
   // meets it, from the last digit on.
   uint32_t k = 0;
-  for (uint64_t pairs = 0; digitCount - k >= 16 && detail::hexPairs16(text + last - k - 15, pairs);
-       k += 16) {
-    unsigned char* out = bytes + k / 2;  // pair m goes to byte k/2 + 7 - m
-    for (unsigned m = 0; m < 8; ++m) out[7 - m] = static_cast<unsigned char>(pairs >> (8 * m));
+  for (uint64_t pairs = 0; count - k >= 16 && detail::hexPairs16(last - k - 15, pairs); k += 16) {
+    unsigned char* block = bytes + k / 2;  // pair m goes to byte k/2 + 7 - m
+    for (unsigned m = 0; m < 8; ++m) block[7 - m] = static_cast<unsigned char>(pairs >> (8 * m));
   }
-  for (; k < digitCount; ++k) {
-    int v = detail::kHexValues[static_cast<unsigned char>(text[last - k])];
-    if (v < 0) v = detail::hexValue(text[last - k], "Zin_ByteBuffer::hex2Bin");
+  for (; k < count; ++k) {
+    int v = detail::kHexValues[static_cast<unsigned char>(last[-static_cast<ptrdiff_t>(k)])];
+    if (v < 0) v = detail::hexValue(last[-static_cast<ptrdiff_t>(k)], "Zin_ByteBuffer::hex2Bin");
     bytes[k / 2] |= static_cast<unsigned char>(k % 2 == 0 ? v : v << 4);
   }
-  return bin.release();
 }
 
 }  // namespace ZinRT

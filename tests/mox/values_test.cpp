@@ -192,6 +192,20 @@ class ReadValues : public SessionFixture {
     uintptr_t word = mapWord(map);
     return ZinMOX_readValues(handle, &ref, &word);
   }
+  // Enters into `expected` the texts of one signal as `image` gives them: the hexadecimal text of
+  // the port characters at the positions (value bit i at port bit at[i]) under each key.
+  static void report(ZinMOX_ValueMap& expected, const InputImage& image, const std::string& name,
+                     bool sync, const std::vector<uint32_t>& at) {
+    const char* suffixes[] = {".value", ".activity_up", ".activity_down", ".sync_activity_up",
+                              ".sync_activity_down"};
+    for (int k = 0; k < (sync ? 5 : 3); ++k) {
+      const std::string& port = *image.vectors()[sync * 3 + k];
+      std::string bits;
+      for (std::size_t i = at.size(); i-- > 0;) bits.push_back(port[at[i]]);
+      expected[name + suffixes[k]] = bitsToHex(bits);
+    }
+    expected[name] = expected[name + ".value"];
+  }
 };
 
 TEST_F(ReadValues, ReportsEveryInputUnderItsKeysAndKeepsOtherKeys) {
@@ -209,28 +223,56 @@ TEST_F(ReadValues, ReportsEveryInputUnderItsKeysAndKeepsOtherKeys) {
   ASSERT_EQ(read(map), 0u);
   expectNoMessages();
   ZinMOX_ValueMap expected{{"unrelated", "keep"}, {"async_out_data", "7"}};
-  // The hexadecimal text of the port characters at the positions (value bit i at port bit
-  // positions[i]) under each key of a signal, the keys in the order of the image's vectors.
-  const auto add = [&](const std::string& name, bool sync, const std::vector<uint32_t>& at) {
-    const char* suffixes[] = {".value", ".activity_up", ".activity_down", ".sync_activity_up",
-                              ".sync_activity_down"};
-    for (int k = 0; k < (sync ? 5 : 3); ++k) {
-      const std::string& port = *image.vectors()[sync * 3 + k];
-      std::string bits;
-      for (std::size_t i = at.size(); i-- > 0;) bits.push_back(port[at[i]]);
-      expected[name + suffixes[k]] = bitsToHex(bits);
-    }
-    expected[name] = expected[name + ".value"];
-  };
-  add("a", false, a);
-  add("s", true, s);
-  add("Ctl", true, ctl);
-  add("async_in_data", false, range(0, 4));
-  add("sync_in_data", true, range(0, 3));
+  report(expected, image, "a", false, a);
+  report(expected, image, "s", true, s);
+  report(expected, image, "Ctl", true, ctl);
+  report(expected, image, "async_in_data", false, range(0, 4));
+  report(expected, image, "sync_in_data", true, range(0, 3));
   EXPECT_EQ(map, expected);
   const auto sent = transport->transfers();
   ASSERT_EQ(sent.size(), 1u) << "one read for all signals";
   EXPECT_EQ(sent[0].text, readCommandText(linePrefix(ref), 4, 3));
+}
+
+TEST_F(ReadValues, EachReadReportsTheInputsDefinedThenIntoWhatTheMapHoldsThen) {
+  initMoxCore(ref, 4, 2, 0, 0);
+  ASSERT_EQ(defineBus("n", ZINMOX_ASYNC_INPUT, {3, 1}), 0u);
+  struct Named {
+    const char* name;
+    bool sync;
+    std::vector<uint32_t> at;
+  };
+  const Named n{"n", false, {3, 1}}, m{"m", true, {1}};
+  std::mt19937 rng(5);
+  // Reads a random image into `map` and expects exactly `kept` and the reports of the ports and
+  // of `named`.
+  const auto readExpecting = [&](ZinMOX_ValueMap& map, ZinMOX_ValueMap kept,
+                                 const std::vector<Named>& named) {
+    const InputImage image = InputImage::random(4, 2, rng);
+    transport->queueReadData(readDataFor(image));
+    ASSERT_EQ(read(map), 0u);
+    report(kept, image, "async_in_data", false, range(0, 4));
+    report(kept, image, "sync_in_data", true, range(0, 2));
+    for (const Named& signal : named) report(kept, image, signal.name, signal.sync, signal.at);
+    EXPECT_EQ(map, kept);
+  };
+  ZinMOX_ValueMap map;
+  readExpecting(map, {}, {n});
+  // The caller removes, changes and adds entries, enough to make the map rehash.
+  map.erase("n.activity_up");
+  map.erase("sync_in_data");
+  map["n"] = "stale";
+  ZinMOX_ValueMap others;
+  for (int i = 0; i < 300; ++i) others["other" + std::to_string(i)] = "x";
+  map.insert(others.begin(), others.end());
+  readExpecting(map, others, {n});
+
+  ASSERT_EQ(defineBus("m", ZINMOX_SYNC_INPUT, {1}), 0u);
+  ZinMOX_ValueMap fresh;
+  readExpecting(fresh, {}, {n, m});
+  ASSERT_EQ(ZinMOX_undefineName(handle, &ref, "n", ZINMOX_ASYNC_INPUT), 0u);
+  fresh.clear();
+  readExpecting(fresh, {}, {m});
 }
 
 TEST_F(ReadValues, WithoutNamedInputsOrOnAFailedReadTheMapStaysAsItWas) {

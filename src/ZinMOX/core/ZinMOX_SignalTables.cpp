@@ -41,11 +41,6 @@ bool isInputCode(uint32_t signalType) {
   return signalType == 1 || signalType == 3;
 }
 
-ZinMOX_SignalGroup* lookUp(ZinMOX_SignalTable& table, const std::string& name) {
-  auto found = table.find(name);
-  return found == table.end() ? nullptr : found->second;
-}
-
 std::vector<uint32_t> ascendingPositions(uint32_t count) {
   std::vector<uint32_t> positions(count);
   std::iota(positions.begin(), positions.end(), 0u);
@@ -70,7 +65,7 @@ void ZinMOX_Core::defineSignal(const std::string& name, uint32_t signalType,
     }
   }
   ZinMOX_SignalTable& table = port.isInput ? parts->inputSignals : parts->outputSignals;
-  if (lookUp(table, name) != nullptr) {
+  if (findSignal(table, name) != nullptr) {
     throw std::logic_error("The name, " + name +
                            ", is already used by another signal and will not be re-defined. "
                            "Note: Signal names are case-insensitive");
@@ -79,6 +74,7 @@ void ZinMOX_Core::defineSignal(const std::string& name, uint32_t signalType,
       std::make_unique<ZinMOX_SignalGroup>(&parts->command, port.groupType, bitIndexes, name, name);
   table.emplace(group->getKeyName(), group.get());
   group.release();
+  parts->readPlanStale = true;
 }
 
 void ZinMOX_Core::undefineSignal(const std::string& name, uint32_t signalType) {
@@ -92,26 +88,36 @@ void ZinMOX_Core::undefineSignal(const std::string& name, uint32_t signalType) {
   ZinMOX_SignalGroup* group = found->second;
   table.erase(found);  // the key views the group's name, so erase before destroying it
   delete group;
+  parts->readPlanStale = true;
+}
+
+ZinMOX_SignalGroup* findSignal(const ZinMOX_SignalTable& table, std::string_view name) {
+  const auto found = table.find(name);
+  return found == table.end() ? nullptr : found->second;
+}
+
+ZinMOX_SignalGroup* requireSignal(const ZinMOX_SignalTable& table, std::string_view name) {
+  ZinMOX_SignalGroup* group = findSignal(table, name);
+  if (group == nullptr) {
+    throw std::logic_error("Could not find a signal with the name: " + std::string(name));
+  }
+  return group;
 }
 
 ZinMOX_SignalGroup* ZinMOX_Core::getInputSignal(const std::string& name) {
-  return lookUp(parts->inputSignals, name);
+  return findSignal(parts->inputSignals, name);
 }
 
 ZinMOX_SignalGroup* ZinMOX_Core::getOutputSignal(const std::string& name) {
-  return lookUp(parts->outputSignals, name);
+  return findSignal(parts->outputSignals, name);
 }
 
 ZinMOX_SignalGroup* ZinMOX_Core::requireOutputSignal(const std::string& name) {
-  ZinMOX_SignalGroup* group = getOutputSignal(name);
-  if (group == nullptr) throw std::logic_error("Could not find a signal with the name: " + name);
-  return group;
+  return requireSignal(parts->outputSignals, name);
 }
 
 ZinMOX_SignalGroup* ZinMOX_Core::requireInputSignal(const std::string& name) {
-  ZinMOX_SignalGroup* group = getInputSignal(name);
-  if (group == nullptr) throw std::logic_error("Could not find a signal with the name: " + name);
-  return group;
+  return requireSignal(parts->inputSignals, name);
 }
 
 void ZinMOX_Core::getSignalSizes(std::vector<std::string> names, uint32_t* sizes, uint32_t count,

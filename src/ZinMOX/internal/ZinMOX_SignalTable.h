@@ -38,6 +38,12 @@ struct ZinMOX_NameEqual {
 using ZinMOX_SignalTable =
     std::unordered_map<std::string_view, ZinMOX_SignalGroup*, ZinMOX_NameHash, ZinMOX_NameEqual>;
 
+/// The group named `name` in any case, or null.
+ZinMOX_SignalGroup* findSignal(const ZinMOX_SignalTable& table, std::string_view name);
+/// The group named `name` in any case; fails with "Could not find a signal with the name: "
+/// followed by the name otherwise.
+ZinMOX_SignalGroup* requireSignal(const ZinMOX_SignalTable& table, std::string_view name);
+
 }  // namespace ZinRT
 
 #endif

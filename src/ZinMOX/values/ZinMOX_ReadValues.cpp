@@ -1,7 +1,9 @@
 // Reading named inputs: every input into a value map, or samples of named inputs into arrays.
+#include <cstring>
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "ZinMOX/ZinMOX_SignalGroup.h"
@@ -17,21 +19,59 @@ bool isSyncInput(const ZinMOX_SignalGroup& group) {
   return mox::plainSignalType(group.getType()) == Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_INPUT;
 }
 
-// Stores under `key` the hexadecimal text of the `width`-bit packed vector that starts at byte
-// `start` of `vectors`, reusing the entry's storage when the key is already there.
-const std::string& storeText(ZinMOX_ValueMap& map, const std::string& key,
-                             const std::vector<uint8_t>& vectors, uint32_t start, uint32_t width) {
-  std::string& text = map[key];
-  mox::packedHexText(vectors.data() + start, width, text);
-  return text;
+// The suffixes of the keys a signal is reported under, after its plain name; the first four
+// belong to every input, the last two to synchronous inputs only. Key k > 1 holds the packed
+// vector k - 1 of the signal's buffer.
+constexpr std::string_view kReportSuffixes[ZinMOX_ReportedSignal::kMaxKeys] = {
+    "", ".value", ".activity_up", ".activity_down", ".sync_activity_up", ".sync_activity_down"};
+
+// Notes every input's keys with their hashes under the value map's own hash function.
+void planReport(const ZinMOX_SignalTable& inputs, std::vector<ZinMOX_ReportedSignal>& plan,
+                std::string& key) {
+  plan.clear();
+  plan.reserve(inputs.size());
+  for (const auto& entry : inputs) {
+    ZinMOX_ReportedSignal& signal = plan.emplace_back();
+    signal.group = entry.second;
+    signal.keyCount = isSyncInput(*entry.second) ? 6 : 4;
+    for (uint32_t k = 0; k < signal.keyCount; ++k) {
+      key.assign(entry.second->getKeyName()).append(kReportSuffixes[k]);
+      signal.keyHashes[k] = ZinMOX_ValueMap::hasher{}(key);
+    }
+  }
+}
+
+// Whether `key` is `name` followed by `suffix`.
+bool isKey(const std::string& key, const std::string& name, std::string_view suffix) {
+  return key.size() == name.size() + suffix.size() &&
+         std::memcmp(key.data(), name.data(), name.size()) == 0 &&
+         std::memcmp(key.data() + name.size(), suffix.data(), suffix.size()) == 0;
+}
+
+// The map's entry for `name` followed by `suffix`, added empty when absent. `hash` is the map's
+// hash of that key: the entry is looked for in the bucket the map keeps it in, which spares
+// building and hashing the key. A key that is not there goes through the map's own lookup,
+// which also keeps this right for a map that places its keys otherwise.
+std::string& entryOf(ZinMOX_ValueMap& map, const std::string& name, std::string_view suffix,
+                     std::size_t hash, std::string& key) {
+  const std::size_t buckets = map.bucket_count();
+  if (buckets != 0) {
+    const std::size_t bucket = hash % buckets;
+    for (auto it = map.begin(bucket), end = map.end(bucket); it != end; ++it) {
+      if (isKey(it->first, name, suffix)) return it->second;
+    }
+  }
+  key.assign(name).append(suffix);
+  return map[key];
 }
 
 // Writes one signal's value and activity texts under its name and suffixed keys.
-void reportSignal(const ZinMOX_SignalGroup& group, ZinMOX_ValueMap& map, std::string& key,
+void reportSignal(const ZinMOX_ReportedSignal& signal, ZinMOX_ValueMap& map, std::string& key,
                   std::vector<uint8_t>& vectors) {
+  const ZinMOX_SignalGroup& group = *signal.group;
   const uint32_t width = group.size();
   const uint32_t bytes = mox::byteCount(width);
-  const bool sync = isSyncInput(group);
+  const bool sync = signal.keyCount == ZinMOX_ReportedSignal::kMaxKeys;
   // The five vectors (value, activity up and down, sync activity up and down) lie one after
   // another in one zero-filled buffer.
   vectors.assign(static_cast<size_t>(sync ? 5 : 3) * bytes, 0);
@@ -40,19 +80,14 @@ void reportSignal(const ZinMOX_SignalGroup& group, ZinMOX_ValueMap& map, std::st
                   sync ? at + 4 * bytes : nullptr, bytes);
 
   const std::string& name = group.getKeyName();
-  const std::string& value = storeText(map, name, vectors, 0, width);
-  const size_t nameLength = name.size();
-  const auto keyOf = [&](const char* suffix) -> const std::string& {
-    key.assign(name, 0, nameLength);
-    key += suffix;
-    return key;
+  const auto entry = [&](uint32_t k) -> std::string& {
+    return entryOf(map, name, kReportSuffixes[k], signal.keyHashes[k], key);
   };
-  map[keyOf(".value")] = value;  // element references survive the map's growth
-  storeText(map, keyOf(".activity_up"), vectors, bytes, width);
-  storeText(map, keyOf(".activity_down"), vectors, 2 * bytes, width);
-  if (sync) {
-    storeText(map, keyOf(".sync_activity_up"), vectors, 3 * bytes, width);
-    storeText(map, keyOf(".sync_activity_down"), vectors, 4 * bytes, width);
+  std::string& value = entry(0);
+  mox::packedHexText(vectors.data(), width, value);
+  entry(1) = value;  // element references survive the map's growth
+  for (uint32_t k = 2; k < signal.keyCount; ++k) {
+    mox::packedHexText(vectors.data() + (k - 1) * bytes, width, entry(k));
   }
 }
 
@@ -68,8 +103,12 @@ void ZinMOX_Core::readValues(uint32_t handle, ZIN_CORE_REF coreRef, ZinMOX_Value
     throw std::logic_error("ZinMOX_Core::readValues() arg. failed:inputHashMap!=0");
   }
   parts->command.readInputs(handle, coreRef);
-  for (const auto& entry : parts->inputSignals) {
-    reportSignal(*entry.second, *inputHashMap, parts->readKey, parts->readVectors);
+  if (parts->readPlanStale) {
+    planReport(parts->inputSignals, parts->readPlan, parts->readKey);
+    parts->readPlanStale = false;
+  }
+  for (const ZinMOX_ReportedSignal& signal : parts->readPlan) {
+    reportSignal(signal, *inputHashMap, parts->readKey, parts->readVectors);
   }
 }
 

@@ -4,6 +4,7 @@
 #include <stdexcept>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "ZinMOX/ZinMOX_SignalGroup.h"
 #include "framework/ZinMOX_Framework.h"
@@ -20,34 +21,36 @@ constexpr std::string_view PULSE_TRAIN_SUFFIX = "pulsetrain";
 constexpr uint32_t PULSE_TRAIN_BITS_PER_BYTE = 256;
 constexpr uint32_t BURST_STEPS = ZinMOX_Command::STEP_COUNT;
 
-// A map key split at its first dot into the signal name and the suffix.
+// A map key split at its first dot into the signal name and whether the suffix is the pulse
+// train's.
 struct ValueKey {
-  std::string name;
+  std::string_view name;
   bool pulseTrain;
 };
 
 ValueKey splitKey(const std::string& key) {
-  const size_t dot = key.find('.');
-  if (dot == std::string::npos) return {key, false};
-  return {key.substr(0, dot), std::string_view(key).substr(dot + 1) == PULSE_TRAIN_SUFFIX};
+  const std::string_view whole(key);
+  const size_t dot = whole.find('.');
+  if (dot == std::string_view::npos) return {whole, false};
+  return {whole.substr(0, dot), whole.substr(dot + 1) == PULSE_TRAIN_SUFFIX};
 }
 
 bool isSyncOutput(const ZinMOX_SignalGroup& group) {
   return mox::plainSignalType(group.getType()) == Zin_SignalBase::SIGNAL_TYPE_MOX_SYNC_OUTPUT;
 }
 
-// Fits and converts one value text, then stages it into the group.
-void stageText(ZinMOX_SignalGroup& group, const std::string& text, bool pulseTrain) {
+// Fits and converts one value text in the core's scratch buffers, then stages it into the group.
+void stageText(ZinMOX_SignalGroup& group, const std::string& text, bool pulseTrain,
+               Zin_ByteBuffer& scratch, Zin_ByteBuffer& bytes) {
   const uint32_t width =
       pulseTrain ? PULSE_TRAIN_BITS_PER_BYTE * mox::byteCount(group.size()) : group.size();
-  std::unique_ptr<Zin_ByteBuffer> fitted =
-      mox::fitHexString(text.c_str(), static_cast<int32_t>(width));
+  const mox::FittedHex fitted = mox::fitHexString(text.c_str(), static_cast<int32_t>(width));
   // The fitting checked every digit. Of a pulse train only the 16 step vectors in the last
   // digits are staged, so only those are converted.
-  const uint32_t last = fitted->getSize() - 2;
-  const uint32_t first = pulseTrain ? last + 1 - 2 * BURST_STEPS * mox::byteCount(group.size()) : 0;
-  std::unique_ptr<Zin_ByteBuffer> bytes(fitted->hex2Bin(first, last));
-  group.setValues(bytes->uPtr(), bytes->getSize(), pulseTrain ? BURST_STEPS : 1);
+  const size_t last = fitted.size() - 1;
+  const size_t first = pulseTrain ? last + 1 - 2 * BURST_STEPS * mox::byteCount(group.size()) : 0;
+  mox::fittedToBin(fitted, first, last, scratch, bytes);
+  group.setValues(bytes.uPtr(), bytes.getSize(), pulseTrain ? BURST_STEPS : 1);
 }
 
 }  // namespace
@@ -57,18 +60,24 @@ void ZinMOX_Core::writeValues(uint32_t handle, ZIN_CORE_REF coreRef,
   if (outputHashMap == nullptr) {
     throw std::logic_error("ZinMOX_Core::writeValues() arg. failed:outputHashMap!=0");
   }
+  // The first visit checks every key and keeps its group, so that the second, which stages the
+  // values, looks nothing up again.
+  std::vector<ZinMOX_StagedValue>& plan = parts->writePlan;
+  plan.clear();
   for (const auto& [key, text] : *outputHashMap) {
     const ValueKey parsed = splitKey(key);
-    const ZinMOX_SignalGroup* group = requireOutputSignal(parsed.name);
+    ZinMOX_SignalGroup* group = requireSignal(parts->outputSignals, parsed.name);
     if (parsed.pulseTrain && !isSyncOutput(*group)) {
       throw std::logic_error(".pulsetrain cannot be used with the non-synchronous output: " +
-                             parsed.name);
+                             std::string(parsed.name));
     }
+    plan.push_back({group, parsed.pulseTrain});
   }
   parts->command.clearUpdateMasks();
+  auto staged = plan.begin();
   for (const auto& [key, text] : *outputHashMap) {
-    const ValueKey parsed = splitKey(key);
-    stageText(*requireOutputSignal(parsed.name), text, parsed.pulseTrain);
+    stageText(*staged->group, text, staged->pulseTrain, parts->writeText, parts->writeBytes);
+    ++staged;
   }
   parts->command.writeOutputs(handle, coreRef);
 }
